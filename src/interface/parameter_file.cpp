@@ -1,0 +1,47 @@
+#include "interface/parameter_file.h"
+
+#include <climits>
+#include <cmath>
+#include <cstdio>
+
+namespace vantrel {
+namespace {
+
+// Lines are read in pieces of this many characters.
+constexpr int kLinePiece = 255;
+
+bool ParseValue(const char* line, int& value) {
+    if (line[0] == '#' || line[0] == '\r' || line[0] == '\n' || line[0] == '\0') return false;
+    double number = 0;
+    if (std::sscanf(line, "%lf", &number) != 1 || std::isnan(number)) return false;
+    // Truncation toward zero; numbers beyond the int range keep its ends.
+    if (number >= static_cast<double>(INT_MAX)) value = INT_MAX;
+    else if (number <= static_cast<double>(INT_MIN)) value = INT_MIN;
+    else value = static_cast<int>(number);
+    return true;
+}
+
+}  // namespace
+
+int ReadParameterFile(const std::string& path, int* values, int limit) {
+    std::FILE* file = std::fopen(path.c_str(), "r");
+    if (!file) return 0;
+    int stored = 0;
+    // The first 255 characters of a line decide; the rest of an over-long line
+    // belongs to that line and is passed over, not read as a further value.
+    char line[kLinePiece + 1];
+    int c = 0;
+    while (stored < limit && c != EOF) {
+        size_t length = 0;
+        while ((c = std::fgetc(file)) != EOF && c != '\n')
+            if (length < kLinePiece) line[length++] = static_cast<char>(c);
+        if (c == EOF && length == 0) break;
+        line[length] = '\0';
+        int value = 0;
+        if (ParseValue(line, value)) values[stored++] = value;
+    }
+    std::fclose(file);
+    return stored;
+}
+
+}  // namespace vantrel

@@ -1,0 +1,94 @@
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "eval/gamut_record.h"
+#include "icc/profil.h"
+#include "it8/measured_it8.h"
+#include "vantrel.h"
+
+namespace vantrel {
+
+struct Lab3 {
+    double L = 0, a = 0, b = 0;
+};
+
+// Default labels of the file names: a name holding one means nothing is selected.
+inline constexpr const char* kNo3ccSelected = "-no 3CC selected-";
+inline constexpr const char* kNoProfileSelected = "-no profile selected-";
+inline constexpr const char* kNoIsdSelected = "-no ISD selected-";
+inline constexpr const char* kNoFileSelected = "-no file selected-";
+
+// All state of one job: the tool object behind a tool handle.
+class CIterativtoolDlg {
+public:
+    static constexpr int kParamCount = 20;
+
+    // Creates the profile and measurement slots and, for a non-empty dir, writes the
+    // embedded identity profiles into it (dir is a prefix: "dir/" or "dir" + name).
+    explicit CIterativtoolDlg(const char* dir);
+    virtual ~CIterativtoolDlg();
+    CIterativtoolDlg(const CIterativtoolDlg&) = delete;
+    CIterativtoolDlg& operator=(const CIterativtoolDlg&) = delete;
+
+    // True when every profile and measurement slot could be created.
+    bool SlotsCreated() const;
+    // Writes the four identity profiles to m_WorkDir + file name, overwriting existing files.
+    void WriteEmbeddedProfiles();
+    // Reports progress to the host, if it gave a function; returns its answer.
+    int Progress(const char* text, int step, int steps) const;
+
+    // Profile slots.
+    std::unique_ptr<CProfil> m_Outprof;
+    std::unique_ptr<CProfil> m_Refprof;
+    std::unique_ptr<CProfil> m_Paperprof;
+    std::unique_ptr<CProfil> m_ISDprof;
+    std::unique_ptr<CProfil> m_PaperprofPerceptual;
+
+    int m_UseIntent0 = 0;
+    int m_RecalcFlag = 0;
+    int m_CalRun = -1;
+
+    // Measurement slots.
+    std::unique_ptr<Measured_IT8> m_ReferenceIT8;
+    std::unique_ptr<Measured_IT8> m_MeasIT8;
+    std::unique_ptr<Measured_IT8> m_PrevMeasIT8;
+
+    Lab3 m_RefWhite;
+    Lab3 m_MeasWhite;
+    Lab3 m_PaperWhite;
+
+    GamutRecord m_Gamut;
+
+    // A saved copy of the paper profile's table, kept by the output-profile optimisation.
+    std::vector<uint16_t> m_SavedTable;
+
+    ProgressCallback m_Progress = nullptr;
+
+    std::string m_OutprofName = kNo3ccSelected;
+    std::string m_RefName = kNoProfileSelected;
+    std::string m_PaperName = kNoProfileSelected;
+    std::string m_ISDName = kNoIsdSelected;
+    std::string m_WorkDir;
+    std::string m_ReferenceIT8Name = kNoFileSelected;
+    std::string m_MeasIT8Name = kNoFileSelected;
+
+    double m_Score1 = 0;
+    double m_Score2 = 0;
+
+    int m_OptimizeOption = 0;
+    int m_OptFlagA = 1;
+    int m_OptFlagB = 1;
+    int m_AbstractOutprof = 0;
+    int m_ISDMode = 0;
+    int m_WriteExtra = 0;
+    int m_CorrectOutprof = 0;
+
+    std::array<int, kParamCount> m_Params{};
+};
+
+}  // namespace vantrel

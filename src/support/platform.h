@@ -1,0 +1,37 @@
+#pragma once
+
+#include <cstdint>
+#include <vector>
+
+// What the library takes from the operating system: its fixed file paths and the
+// identity profiles embedded in the library's own file.
+namespace vantrel::platform {
+
+// The parameter file read when a tool object is created.
+const char* ParameterFilePath();
+// The ISD profile that the reference analysis writes and reads.
+const char* IsdProfilePath();
+
+// Resource ids of the embedded identity profiles.
+constexpr int kNeutral3ccId = 102;
+constexpr int kCmykLinkId = 103;
+constexpr int kCmykogLinkId = 104;
+constexpr int kCmykrgbLinkId = 105;
+
+// The library's own module, held open while its resources are read.
+class ModuleResources {
+public:
+    ModuleResources();
+    ~ModuleResources();
+    ModuleResources(const ModuleResources&) = delete;
+    ModuleResources& operator=(const ModuleResources&) = delete;
+
+    bool IsOpen() const { return module_ != nullptr; }
+    // The bytes of one embedded profile; empty when the resource is missing.
+    std::vector<uint8_t> Profile(int id) const;
+
+private:
+    void* module_ = nullptr;
+};
+
+}  // namespace vantrel::platform
