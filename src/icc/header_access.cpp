@@ -1,0 +1,111 @@
+#include <cmath>
+#include <cstring>
+
+#include "icc/icc_bytes.h"
+#include "icc/profil.h"
+
+namespace vantrel {
+namespace {
+
+uint32_t GetU32(const uint8_t* at) {
+    return uint32_t{at[0]} << 24 | uint32_t{at[1]} << 16 | uint32_t{at[2]} << 8 | uint32_t{at[3]};
+}
+
+void PutU32(uint8_t* at, uint32_t value) {
+    at[0] = static_cast<uint8_t>(value >> 24);
+    at[1] = static_cast<uint8_t>(value >> 16);
+    at[2] = static_cast<uint8_t>(value >> 8);
+    at[3] = static_cast<uint8_t>(value);
+}
+
+// The companding of the white-point Lab; its linear part ends in 0.138, not 16/116.
+double WhiteF(double t) { return t > 0.008856 ? std::pow(t, 1.0 / 3.0) : 7.787 * t + 0.138; }
+
+constexpr size_t kIlluminantAt = 68;
+
+}  // namespace
+
+void CProfil::SetCmmType(const char* fourChars) {
+    if (!fourChars) return;
+    for (int k = 0; k < 4 && fourChars[k]; ++k) m_Header[4 + k] = static_cast<uint8_t>(fourChars[k]);
+}
+
+void CProfil::SetDeviceClass(int kind) {
+    const char* name = kind == 0 ? "mntr" : kind == 1 ? "prtr" : kind == 2 ? "scnr" : nullptr;
+    if (name) std::memcpy(m_Header + 12, name, 4);
+}
+
+uint32_t CProfil::IlluminantX() const { return GetU32(m_Header + kIlluminantAt); }
+uint32_t CProfil::IlluminantY() const { return GetU32(m_Header + kIlluminantAt + 4); }
+uint32_t CProfil::IlluminantZ() const { return GetU32(m_Header + kIlluminantAt + 8); }
+
+void CProfil::SetIlluminant(uint32_t x, uint32_t y, uint32_t z) {
+    PutU32(m_Header + kIlluminantAt, x & 0xFFFF);
+    PutU32(m_Header + kIlluminantAt + 4, y);
+    PutU32(m_Header + kIlluminantAt + 8, z);
+}
+
+void CProfil::SetMediaWhite(int direction, char axis, double value) {
+    if (direction != 0 && direction != 1) return;
+    const int index = axis == 'X' || axis == 'x' ? 0 : axis == 'Y' || axis == 'y' ? 1 : axis == 'Z' || axis == 'z' ? 2 : -1;
+    if (index >= 0) m_MediaWhite[direction][index] = value;
+}
+
+Lab CProfil::WhiteLab(int direction) const {
+    if (direction != 0 && direction != 1) return {};
+    const double* white = m_MediaWhite[direction];
+    const double* illuminant = m_Illuminant[direction];
+    if (illuminant[0] == 0 || illuminant[1] == 0 || illuminant[2] == 0) return {};
+    const double fx = WhiteF(white[0] / illuminant[0]);
+    const double fy = WhiteF(white[1] / illuminant[1]);
+    const double fz = WhiteF(white[2] / illuminant[2]);
+    return {116.0 * fy - 16.0, 500.0 * (fx - fy), 200.0 * (fy - fz)};
+}
+
+double CProfil::WhiteL(int direction) const { return WhiteLab(direction).L; }
+double CProfil::WhiteA(int direction) const { return WhiteLab(direction).a; }
+double CProfil::WhiteB(int direction) const { return WhiteLab(direction).b; }
+
+void CProfil::SetWhiteL(int direction, double lOver100) {
+    if (direction != 0 && direction != 1) return;
+    m_SlotWhite[direction][0] = lOver100;
+    MediaWhiteFromSlotWhite(direction);
+}
+
+void CProfil::SetWhiteA(int direction, double a) {
+    if (direction != 0 && direction != 1) return;
+    m_SlotWhite[direction][1] = a;
+    MediaWhiteFromSlotWhite(direction);
+}
+
+void CProfil::SetWhiteB(int direction, double b) {
+    if (direction != 0 && direction != 1) return;
+    m_SlotWhite[direction][2] = b;
+    MediaWhiteFromSlotWhite(direction);
+}
+
+void CProfil::MediaWhiteFromSlotWhite(int direction) {
+    const double L = 100.0 * m_SlotWhite[direction][0];
+    const double fy = (L + 16.0) / 116.0;
+    const double fx = fy + m_SlotWhite[direction][1] / 500.0;
+    const double fz = fy - m_SlotWhite[direction][2] / 200.0;
+    m_MediaWhite[direction][0] = fx * fx * fx * (IlluminantX() / 65536.0);
+    m_MediaWhite[direction][1] = fy * fy * fy * (IlluminantY() / 65536.0);
+    m_MediaWhite[direction][2] = fz * fz * fz * (IlluminantZ() / 65536.0);
+}
+
+int64_t CProfil::FindWhitePointOffset(int direction, const std::string& path) {
+    if (direction != 0 && direction != 1) return -1;
+    IccBytes file;
+    if (!file.Load(path)) return -1;
+    ReadTagTable(direction, path);
+    for (const TagEntry& entry : m_Tags[direction])
+        if (entry.signature == "wtpt") {
+            // The three XYZ numbers must lie inside the file to be patched.
+            if (!file.Has(uint64_t{entry.offset} + 8, 12)) return -1;
+            return int64_t{entry.offset} + 8;
+        }
+    return -1;
+}
+
+}  // namespace vantrel

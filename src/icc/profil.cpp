@@ -1,0 +1,66 @@
+#include "icc/profil.h"
+
+#include <cstring>
+
+namespace vantrel {
+namespace {
+
+void PutU32(uint8_t* at, uint32_t value) {
+    at[0] = static_cast<uint8_t>(value >> 24);
+    at[1] = static_cast<uint8_t>(value >> 16);
+    at[2] = static_cast<uint8_t>(value >> 8);
+    at[3] = static_cast<uint8_t>(value);
+}
+
+}  // namespace
+
+CProfil::CProfil() {
+    // A profile that has read nothing describes a D50 printer profile.
+    std::memcpy(m_Header + 4, "appl", 4);
+    std::memcpy(m_Header + 12, "prtr", 4);
+    std::memcpy(m_Header + 36, "acsp", 4);
+    PutU32(m_Header + 68, 63188);
+    PutU32(m_Header + 72, 65535);
+    PutU32(m_Header + 76, 54059);
+}
+
+void CProfil::Release() {
+    for (auto& tags : m_Tags) tags.clear();
+    for (int slot = 0; slot < kSlots; ++slot) {
+        m_InputCurves[slot] = {};
+        m_Clut[slot] = {};
+        m_OutputCurves[slot] = {};
+        for (auto& curve : m_Trc[slot].curve) curve = {};
+    }
+    m_Precision[0] = kReleasedMarker;
+}
+
+bool CProfil::SlotHolds(int slot) const {
+    if (slot < 0 || slot >= 2) return false;
+    const LutSlot& lut = m_Lut[slot];
+    if (lut.type == "MATR") {
+        for (const auto& curve : m_Trc[slot].curve)
+            if (curve.size() != 256) return false;
+        return true;
+    }
+    const int n = lut.inputChannels;
+    const int m = lut.outputChannels;
+    if (n < 1 || n > kMaxInputs || m < 1 || m > kMaxOutputs || lut.gridPoints < 2) return false;
+    uint64_t nodes = 1;
+    for (int i = 0; i < n; ++i) nodes *= static_cast<uint64_t>(lut.gridPoints);
+    return m_InputCurves[slot].size() == static_cast<uint64_t>(n) * static_cast<uint64_t>(lut.inputEntries) &&
+           m_Clut[slot].size() == nodes * static_cast<uint64_t>(m) &&
+           m_OutputCurves[slot].size() == static_cast<uint64_t>(m) * static_cast<uint64_t>(lut.outputEntries);
+}
+
+void CProfil::ResetSlot(int slot) {
+    m_InputCurves[slot] = {};
+    m_Clut[slot] = {};
+    m_OutputCurves[slot] = {};
+    LutSlot& lut = m_Lut[slot];
+    lut.tagIndex = 0;
+    lut.type.clear();
+    lut.inputChannels = lut.inputEntries = lut.outputChannels = lut.outputEntries = lut.gridPoints = 0;
+}
+
+}  // namespace vantrel
