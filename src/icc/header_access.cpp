@@ -98,14 +98,7 @@ int64_t CProfil::FindWhitePointOffset(int direction, const std::string& path) {
     if (direction != 0 && direction != 1) return -1;
     IccBytes file;
     if (!file.Load(path)) return -1;
-    ReadTagTable(direction, path);
-    for (const TagEntry& entry : m_Tags[direction])
-        if (entry.signature == "wtpt") {
-            // The three XYZ numbers must lie inside the file to be patched.
-            if (!file.Has(uint64_t{entry.offset} + 8, 12)) return -1;
-            return int64_t{entry.offset} + 8;
-        }
-    return -1;
+    return FindXyzData(file, "wtpt");
 }
 
 }  // namespace vantrel

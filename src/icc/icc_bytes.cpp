@@ -15,4 +15,19 @@ bool IccBytes::Load(const std::string& path) {
     return true;
 }
 
+int64_t FindXyzData(const IccBytes& file, const char* signature) {
+    if (!file.Has(0, 132)) return -1;
+    const uint64_t count = file.U32(128);
+    for (uint64_t i = 0; i < count; ++i) {
+        const uint64_t record = 132 + 12 * i;
+        if (!file.Has(record, 12)) return -1;
+        if (file.Signature(record) != signature) continue;
+        const uint64_t offset = file.U32(record + 4);
+        const std::string type = file.Signature(offset);
+        if (file.U32(record + 8) < 20 || !file.Has(offset, 20) || (type != "XYZ " && type != " ZYX")) return -1;
+        return static_cast<int64_t>(offset + 8);
+    }
+    return -1;
+}
+
 }  // namespace vantrel

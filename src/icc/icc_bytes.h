@@ -48,4 +48,8 @@ private:
     std::string bytes_;
 };
 
+// File position of the three numbers of the first `signature` tag ("wtpt") when it is an XYZ
+// number lying inside the file; -1 otherwise.
+int64_t FindXyzData(const IccBytes& file, const char* signature);
+
 }  // namespace vantrel

@@ -118,8 +118,8 @@ public:
     void SetWhiteL(int direction, double lOver100);
     void SetWhiteA(int direction, double a);
     void SetWhiteB(int direction, double b);
-    // File position of the XYZ data of `path`'s "wtpt" tag, or -1. Reads the file's header and
-    // directory into the direction as ReadTagTable does.
+    // File position of the XYZ data of `path`'s "wtpt" tag, or -1 (no such XYZ tag inside the file).
+    // Leaves the profile as it is.
     int64_t FindWhitePointOffset(int direction, const std::string& path);
 
     // ---- colour math against this profile's whites (colour/profile_colour.cpp) ------------------
@@ -131,15 +131,18 @@ public:
     Lab LabToRelative(double L, double a, double b, int direction) const;
 
     // ---- writer (profile_writer.cpp) ------------------------------------------------------------
-    // File position of the first CLUT byte of the direction's loaded tag, 0 when unknown.
+    // File position of the first CLUT byte of the direction's loaded tag, 0 when the file cannot be
+    // read or does not hold the loaded table there.
     int64_t FindClutOffset(int direction, const std::string& path);
     // Writes the slot's CLUT over the same table of `path`; nothing is written unless the file holds,
     // at that tag, a table of the same type and size. True when written.
     bool WriteClut(int direction, const std::string& path);
-    // Recomputes the media white from the slot's white and writes it into `path`'s "wtpt" tag.
+    // Recomputes the media white from the slot's white and writes it into `path`'s "wtpt" tag
+    // (when the file has one of type "XYZ "). True when written.
     bool WriteWhitePoint(int direction, const std::string& path);
     std::vector<uint16_t> SnapshotClut(int slot) const;
-    void RestoreClut(int slot, const std::vector<uint16_t>& snapshot);
+    // Copies a snapshot of the same size back into the slot's CLUT; false (nothing copied) otherwise.
+    bool RestoreClut(int slot, const std::vector<uint16_t>& snapshot);
     // Writes the slot-1 CLUT to `path`, then fills `buffer` (`words` 16-bit words) with the 3-input
     // layout: grid, strides, corner offsets, values, byte size. False when it does not fit.
     bool ExportClut3(const std::string& path, uint16_t* buffer, size_t words);

@@ -1,0 +1,157 @@
+#include <cmath>
+#include <cstring>
+
+#include "icc/icc_bytes.h"
+#include "icc/profil.h"
+#include "support/cfile.h"
+
+namespace vantrel {
+namespace {
+
+bool ValidDirection(int direction) { return direction == 0 || direction == 1; }
+
+void PutU32(uint8_t* at, uint32_t value) {
+    at[0] = static_cast<uint8_t>(value >> 24);
+    at[1] = static_cast<uint8_t>(value >> 16);
+    at[2] = static_cast<uint8_t>(value >> 8);
+    at[3] = static_cast<uint8_t>(value);
+}
+
+// round(value x 65536) as an s15Fixed16Number, kept inside its range.
+uint32_t ToFixed16(double value) {
+    double scaled = std::floor(value * 65536.0 + 0.5);
+    if (!(scaled > -2147483648.0)) scaled = -2147483648.0;
+    if (scaled > 2147483647.0) scaled = 2147483647.0;
+    return static_cast<uint32_t>(static_cast<int32_t>(scaled));
+}
+
+// Patches `bytes` into `path` at `position`; the file must already exist and be long enough.
+bool Patch(const std::string& path, int64_t position, const std::vector<uint8_t>& bytes) {
+    CFile file(path, CFile::kBinary | CFile::kReadWrite);
+    if (!file.IsOpen() || file.Seek(position, 0) != 0) return false;
+    return file.Write(bytes.data(), bytes.size()) == bytes.size();
+}
+
+// Where the CLUT of the slot's tag starts in `file`, after checking that the file holds at that
+// tag the very table that was loaded (type, channels, grid, curve lengths, CLUT inside the file).
+// 0 when it does not.
+uint64_t LoadedClutPosition(const CProfil& p, int direction, const IccBytes& file) {
+    const int slot = direction;
+    const LutSlot& lut = p.m_Lut[slot];
+    const std::vector<TagEntry>& tags = p.m_Tags[direction];
+    if (!p.SlotHolds(slot) || lut.type == "MATR" || lut.tagIndex < 1 ||
+        static_cast<size_t>(lut.tagIndex) > tags.size())
+        return 0;
+    const TagEntry& entry = tags[static_cast<size_t>(lut.tagIndex - 1)];
+    const uint64_t record = CProfil::kHeaderSize + 12 * uint64_t(lut.tagIndex - 1);
+    if (!file.Has(0, CProfil::kHeaderSize) || file.U32(128) < static_cast<uint32_t>(lut.tagIndex) ||
+        !file.Has(record, 12) || file.Signature(record) != entry.signature || file.U32(record + 4) != entry.offset ||
+        file.U32(record + 8) != entry.size)
+        return 0;
+    const uint64_t tag = entry.offset;
+    if (!file.Has(tag, entry.size) || !file.Has(tag, 32) || file.Signature(tag) != lut.type || file.U8(tag + 8) != lut.inputChannels ||
+        file.U8(tag + 9) != lut.outputChannels)
+        return 0;
+
+    const uint64_t n = static_cast<uint64_t>(lut.inputChannels);
+    const uint64_t values = p.m_Clut[slot].size();
+    uint64_t clut = 0;
+    uint64_t width = 2;
+    if (lut.type == "mft1") {
+        if (file.U8(tag + 10) != lut.gridPoints) return 0;
+        clut = tag + 48 + n * 256;
+        width = 1;
+    } else if (lut.type == "mft2") {
+        const uint64_t entries =
+            p.m_FileInputEntries[slot] ? static_cast<uint64_t>(p.m_FileInputEntries[slot]) : uint64_t(lut.inputEntries);
+        if (file.U8(tag + 10) != lut.gridPoints || file.U16(tag + 48) != entries ||
+            file.U16(tag + 50) != static_cast<uint64_t>(lut.outputEntries))
+            return 0;
+        clut = tag + 52 + n * entries * 2;
+    } else {
+        // mAB / mBA: the CLUT head (grid per input, precision byte, padding) takes 20 bytes.
+        const uint64_t head = tag + file.U32(tag + 24);
+        if (!file.Has(head, 20) || file.U8(head + 16) != 2) return 0;
+        for (uint64_t i = 0; i < n; ++i)
+            if (file.U8(head + i) != lut.gridPoints) return 0;
+        clut = head + 20;
+    }
+    return file.Has(clut, values * width) ? clut : 0;
+}
+
+}  // namespace
+
+int64_t CProfil::FindClutOffset(int direction, const std::string& path) {
+    if (!ValidDirection(direction)) return 0;
+    IccBytes file;
+    if (!file.Load(path)) return 0;
+    return static_cast<int64_t>(LoadedClutPosition(*this, direction, file));
+}
+
+bool CProfil::WriteClut(int direction, const std::string& path) {
+    if (!ValidDirection(direction)) return false;
+    IccBytes file;
+    if (!file.Load(path)) return false;
+    const uint64_t position = LoadedClutPosition(*this, direction, file);
+    if (position == 0) return false;
+    const std::vector<uint16_t>& clut = m_Clut[direction];
+    std::vector<uint8_t> bytes;
+    if (m_Lut[direction].type == "mft1") {
+        bytes.reserve(clut.size());
+        for (uint16_t value : clut) bytes.push_back(static_cast<uint8_t>(value & 0xFF));
+    } else {
+        bytes.reserve(2 * clut.size());
+        for (uint16_t value : clut) {
+            bytes.push_back(static_cast<uint8_t>(value >> 8));
+            bytes.push_back(static_cast<uint8_t>(value));
+        }
+    }
+    return Patch(path, static_cast<int64_t>(position), bytes);
+}
+
+bool CProfil::WriteWhitePoint(int direction, const std::string& path) {
+    if (!ValidDirection(direction)) return false;
+    // The media white follows the slot's white whether or not the file can take it.
+    MediaWhiteFromSlotWhite(direction);
+    IccBytes file;
+    if (!file.Load(path)) return false;
+    const int64_t position = FindXyzData(file, "wtpt");
+    if (position < 0) return false;
+    std::vector<uint8_t> bytes(12);
+    for (int axis = 0; axis < 3; ++axis) PutU32(bytes.data() + 4 * axis, ToFixed16(m_MediaWhite[direction][axis]));
+    return Patch(path, position, bytes);
+}
+
+std::vector<uint16_t> CProfil::SnapshotClut(int slot) const { return m_Clut[slot == 0 ? 0 : 1]; }
+
+bool CProfil::RestoreClut(int slot, const std::vector<uint16_t>& snapshot) {
+    std::vector<uint16_t>& clut = m_Clut[slot == 0 ? 0 : 1];
+    if (snapshot.size() != clut.size()) return false;
+    std::copy(snapshot.begin(), snapshot.end(), clut.begin());
+    return true;
+}
+
+bool CProfil::ExportClut3(const std::string& path, uint16_t* buffer, size_t words) {
+    const LutSlot& lut = m_Lut[1];
+    if (!SlotHolds(1) || lut.inputChannels != 3 || lut.outputChannels < 3) return false;
+    WriteClut(1, path);
+    const size_t g = static_cast<size_t>(lut.gridPoints);
+    const size_t nodes = g * g * g;
+    if (!buffer || words < 13 + 3 * nodes) return false;
+    auto word = [](size_t value) { return static_cast<uint16_t>(value); };
+    buffer[0] = word(g);
+    buffer[1] = word(g * g);
+    buffer[2] = word(g);
+    buffer[3] = 1;
+    const size_t corners[8] = {0, 3 * g * g, 3 * g, 3, 3 * (g * g + g), 3 * g * g + 3, 3 * g + 3, 3 * (g * g + g) + 3};
+    for (int k = 0; k < 8; ++k) buffer[4 + k] = word(corners[k]);
+    const size_t m = static_cast<size_t>(lut.outputChannels);
+    for (size_t node = 0; node < nodes; ++node)
+        for (size_t out = 0; out < 3; ++out) buffer[12 + 3 * node + out] = m_Clut[1][node * m + out];
+    buffer[12 + 3 * nodes] = word(6 * nodes + 26);
+    return true;
+}
+
+int32_t CProfil::GridPoints(int kind) const { return m_Lut[kind == 1 ? 1 : kind == 2 ? 2 : 0].gridPoints; }
+
+}  // namespace vantrel
