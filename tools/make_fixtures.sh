@@ -24,3 +24,22 @@ build() {  # name quality
 
 build FOGRA39L m
 build TR003 l
+
+# A locale with a decimal comma, for the measurement-file writer: built from glibc's sources into
+# the fixture directory (tests point LOCPATH at it), since build machines often have only C.UTF-8.
+locale() {  # name
+    name=$1
+    [ -d "$dir/locale/$name.UTF-8" ] && return 0
+    if ! command -v localedef >/dev/null 2>&1 || [ ! -f "/usr/share/i18n/locales/$name" ]; then
+        echo "make_fixtures: localedef or the $name source missing; the decimal-comma test will skip" >&2
+        return 0
+    fi
+    mkdir -p "$dir/locale"
+    localedef -i "$name" -f UTF-8 "$dir/locale/$name.UTF-8.tmp" >/dev/null 2>&1 || true
+    if [ -d "$dir/locale/$name.UTF-8.tmp" ]; then
+        mv "$dir/locale/$name.UTF-8.tmp" "$dir/locale/$name.UTF-8"
+        echo "make_fixtures: built $dir/locale/$name.UTF-8"
+    fi
+}
+
+locale de_DE
