@@ -11,6 +11,7 @@
 
 using namespace vantrel;
 using namespace vantrel::test;
+using namespace vantrel::test::it8;
 
 namespace {
 

@@ -18,6 +18,7 @@
 namespace fs = std::filesystem;
 using vantrel::Measured_IT8;
 using namespace vantrel::test;
+using namespace vantrel::test::it8;
 
 namespace {
 

@@ -8,7 +8,7 @@
 
 #include "helpers/test_paths.h"
 
-namespace vantrel::test {
+namespace vantrel::test::it8 {
 
 // Writes `text` byte for byte (no line-end translation) into dir and returns the path.
 inline std::string WriteFile(const TempDir& dir, const std::string& name, const std::string& text) {
@@ -61,4 +61,4 @@ inline std::string SmallCmykLabFile() {
 // Runs a shell command quietly; true when it exited with 0.
 inline bool RunQuietly(const std::string& command) { return std::system((command + " >/dev/null 2>&1").c_str()) == 0; }
 
-}  // namespace vantrel::test
+}  // namespace vantrel::test::it8
