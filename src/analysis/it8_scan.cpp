@@ -1,0 +1,123 @@
+// The measurement scans of the tool object: the patch with given device values, the paper white,
+// and the XYZ-to-Lab conversion they use for files without Lab.
+#include <cmath>
+
+#include "analysis/it8_kind.h"
+#include "interface/tool_object.h"
+
+namespace vantrel {
+namespace {
+
+constexpr const char* kScanValues = "Scan IT8 for Values...";
+constexpr const char* kScanWhite = "Scan IT8 for White Point...";
+constexpr const char* kFinished = "Finished ...";
+
+bool MatchesTarget(const Measured_IT8& it8, const It8Kind& kind, int patch, const double target[7]) {
+    switch (kind.device) {
+        case It8Kind::kMultiChannel:
+            for (int c = 0; c < 6; ++c)
+                if (it8.GetChannel(patch, c) != target[c]) return false;
+            return !kind.seventhChannel || it8.GetChannel(patch, 6) == target[6];
+        case It8Kind::kRgb:
+            for (int c = 0; c < 3; ++c)
+                if (it8.GetRgb(patch, c) != target[c]) return false;
+            return true;
+        case It8Kind::kCmyk:
+            for (int c = 0; c < 4; ++c)
+                if (it8.GetCmyk(patch, c) != target[c]) return false;
+            return true;
+        case It8Kind::kNoDevice:
+            break;
+    }
+    return false;
+}
+
+bool IsWhite(const Measured_IT8& it8, const It8Kind& kind, int patch) {
+    switch (kind.device) {
+        case It8Kind::kMultiChannel:
+            for (int c = 0; c < 6; ++c)
+                if (it8.GetChannel(patch, c) != 0.0) return false;
+            return !kind.seventhChannel || it8.GetChannel(patch, 6) == 0.0;
+        case It8Kind::kRgb:
+            return it8.GetRgb(patch, 0) == 255.0 && it8.GetRgb(patch, 1) == 255.0 && it8.GetRgb(patch, 2) == 255.0;
+        case It8Kind::kCmyk:
+            // Paper carries no ink; a trace of black below 1 % still counts as paper.
+            return it8.GetCmyk(patch, 0) == 0.0 && it8.GetCmyk(patch, 1) == 0.0 && it8.GetCmyk(patch, 2) == 0.0 &&
+                   it8.GetCmyk(patch, 3) < 1.0;
+        case It8Kind::kNoDevice:
+            break;
+    }
+    return false;
+}
+
+double CieCubeRoot(double r) { return r > 0.008856 ? std::pow(r, 1.0 / 3.0) : 7.787 * r + 16.0 / 116.0; }
+
+}  // namespace
+
+Lab3 CIterativtoolDlg::PatchLab(const Measured_IT8& it8, int patch, bool fromXyz) const {
+    if (fromXyz) return MeasuredXyzToLab(it8.GetXyz(patch, 0), it8.GetXyz(patch, 1), it8.GetXyz(patch, 2));
+    return Lab3{it8.GetLab(patch, 0), it8.GetLab(patch, 1), it8.GetLab(patch, 2)};
+}
+
+Lab3 CIterativtoolDlg::ScanIt8ForValues(const Measured_IT8& it8, const double target[7]) const {
+    const int n = it8.PatchCount();
+    if (n < 1) return Lab3{};
+    const It8Kind kind = ProbeIt8Kind(it8);
+    if (kind.device == It8Kind::kNoDevice) return Lab3{};
+
+    Progress(kScanValues, 0, n);
+    for (int i = 0; i < n; ++i) {
+        if (Progress(kScanValues, i + 1, n) != 0) return Lab3{};
+        if (!MatchesTarget(it8, kind, i, target)) continue;
+        const Lab3 found = PatchLab(it8, i, kind.colourFromXyz);
+        Progress(kFinished, 1, 1);
+        return found;
+    }
+    Progress(kFinished, 1, 1);
+    return Lab3{};
+}
+
+Lab3 CIterativtoolDlg::ScanIt8ForWhitePoint(const Measured_IT8& it8) const {
+    const int n = it8.PatchCount();
+    if (n < 1) return Lab3{};
+    const It8Kind kind = ProbeIt8Kind(it8);
+    if (kind.device == It8Kind::kNoDevice) return Lab3{};
+
+    Lab3 sum;
+    int count = 0;
+    Progress(kScanWhite, 0, n);
+    for (int i = 0; i < n; ++i) {
+        Progress(kScanWhite, i + 1, n);  // the white point scan runs to the end
+        if (!IsWhite(it8, kind, i)) continue;
+        const Lab3 lab = PatchLab(it8, i, kind.colourFromXyz);
+        sum.L += lab.L;
+        sum.a += lab.a;
+        sum.b += lab.b;
+        ++count;
+    }
+    Progress(kFinished, 1, 1);
+    if (count > 0) {
+        sum.L /= count;
+        sum.a /= count;
+        sum.b /= count;
+    }
+    return sum;
+}
+
+Lab3 CIterativtoolDlg::MeasuredXyzToLab(double X, double Y, double Z) const {
+    X /= 100.0;
+    Y /= 100.0;
+    Z /= 100.0;
+    for (const CProfil* profile : {m_Outprof.get(), m_Paperprof.get(), m_Refprof.get(), m_ISDprof.get()}) {
+        if (!profile || !profile->HoldsTables()) continue;
+        const Lab lab = profile->XYZToLab(X, Y, Z);
+        return Lab3{lab.L, lab.a, lab.b};
+    }
+    // No profile loaded: D50 and the plain CIE formula.
+    const double fx = CieCubeRoot(X / 0.9642);
+    const double fy = CieCubeRoot(Y / 1.0);
+    const double fz = CieCubeRoot(Z / 0.8249);
+    return Lab3{116.0 * fy - 16.0, 500.0 * (fx - fy), 200.0 * (fy - fz)};
+}
+
+}  // namespace vantrel
