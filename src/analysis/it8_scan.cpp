@@ -54,42 +54,42 @@ double CieCubeRoot(double r) { return r > 0.008856 ? std::pow(r, 1.0 / 3.0) : 7.
 
 }  // namespace
 
-Lab3 CIterativtoolDlg::PatchLab(const Measured_IT8& it8, int patch, bool fromXyz) const {
+Lab CIterativtoolDlg::PatchLab(const Measured_IT8& it8, int patch, bool fromXyz) const {
     if (fromXyz) return MeasuredXyzToLab(it8.GetXyz(patch, 0), it8.GetXyz(patch, 1), it8.GetXyz(patch, 2));
-    return Lab3{it8.GetLab(patch, 0), it8.GetLab(patch, 1), it8.GetLab(patch, 2)};
+    return Lab{it8.GetLab(patch, 0), it8.GetLab(patch, 1), it8.GetLab(patch, 2)};
 }
 
-Lab3 CIterativtoolDlg::ScanIt8ForValues(const Measured_IT8& it8, const double target[7]) const {
+Lab CIterativtoolDlg::ScanIt8ForValues(const Measured_IT8& it8, const double target[7]) const {
     const int n = it8.PatchCount();
-    if (n < 1) return Lab3{};
+    if (n < 1) return Lab{};
     const It8Kind kind = ProbeIt8Kind(it8);
-    if (kind.device == It8Kind::kNoDevice) return Lab3{};
+    if (kind.device == It8Kind::kNoDevice) return Lab{};
 
     Progress(kScanValues, 0, n);
     for (int i = 0; i < n; ++i) {
-        if (Progress(kScanValues, i + 1, n) != 0) return Lab3{};
+        if (Progress(kScanValues, i + 1, n) != 0) return Lab{};
         if (!MatchesTarget(it8, kind, i, target)) continue;
-        const Lab3 found = PatchLab(it8, i, kind.colourFromXyz);
+        const Lab found = PatchLab(it8, i, kind.colourFromXyz);
         Progress(kFinished, 1, 1);
         return found;
     }
     Progress(kFinished, 1, 1);
-    return Lab3{};
+    return Lab{};
 }
 
-Lab3 CIterativtoolDlg::ScanIt8ForWhitePoint(const Measured_IT8& it8) const {
+Lab CIterativtoolDlg::ScanIt8ForWhitePoint(const Measured_IT8& it8) const {
     const int n = it8.PatchCount();
-    if (n < 1) return Lab3{};
+    if (n < 1) return Lab{};
     const It8Kind kind = ProbeIt8Kind(it8);
-    if (kind.device == It8Kind::kNoDevice) return Lab3{};
+    if (kind.device == It8Kind::kNoDevice) return Lab{};
 
-    Lab3 sum;
+    Lab sum;
     int count = 0;
     Progress(kScanWhite, 0, n);
     for (int i = 0; i < n; ++i) {
         Progress(kScanWhite, i + 1, n);  // the white point scan runs to the end
         if (!IsWhite(it8, kind, i)) continue;
-        const Lab3 lab = PatchLab(it8, i, kind.colourFromXyz);
+        const Lab lab = PatchLab(it8, i, kind.colourFromXyz);
         sum.L += lab.L;
         sum.a += lab.a;
         sum.b += lab.b;
@@ -104,20 +104,20 @@ Lab3 CIterativtoolDlg::ScanIt8ForWhitePoint(const Measured_IT8& it8) const {
     return sum;
 }
 
-Lab3 CIterativtoolDlg::MeasuredXyzToLab(double X, double Y, double Z) const {
+Lab CIterativtoolDlg::MeasuredXyzToLab(double X, double Y, double Z) const {
     X /= 100.0;
     Y /= 100.0;
     Z /= 100.0;
     for (const CProfil* profile : {m_Outprof.get(), m_Paperprof.get(), m_Refprof.get(), m_ISDprof.get()}) {
         if (!profile || !profile->HoldsTables()) continue;
         const Lab lab = profile->XYZToLab(X, Y, Z);
-        return Lab3{lab.L, lab.a, lab.b};
+        return Lab{lab.L, lab.a, lab.b};
     }
     // No profile loaded: D50 and the plain CIE formula.
     const double fx = CieCubeRoot(X / 0.9642);
     const double fy = CieCubeRoot(Y / 1.0);
     const double fz = CieCubeRoot(Z / 0.8249);
-    return Lab3{116.0 * fy - 16.0, 500.0 * (fx - fy), 200.0 * (fy - fz)};
+    return Lab{116.0 * fy - 16.0, 500.0 * (fx - fy), 200.0 * (fy - fz)};
 }
 
 }  // namespace vantrel

@@ -45,14 +45,14 @@ public:
     // Measurement scans (analysis/it8_scan.cpp). Zeros mean nothing was found.
     // The colour of the first patch whose device values equal target (CMYK and multi-channel in
     // percent, RGB 0..255); a non-zero answer of the progress function cancels it.
-    Lab3 ScanIt8ForValues(const Measured_IT8& it8, const double target[7]) const;
+    Lab ScanIt8ForValues(const Measured_IT8& it8, const double target[7]) const;
     // The average colour of the patches printed without ink.
-    Lab3 ScanIt8ForWhitePoint(const Measured_IT8& it8) const;
+    Lab ScanIt8ForWhitePoint(const Measured_IT8& it8) const;
     // Lab of a measured XYZ (white Y near 100) against the first loaded profile's illuminant
     // (m_Outprof, m_Paperprof, m_Refprof, m_ISDprof), else against D50.
-    Lab3 MeasuredXyzToLab(double X, double Y, double Z) const;
+    Lab MeasuredXyzToLab(double X, double Y, double Z) const;
     // A patch's colour, from its Lab or converted from its XYZ.
-    Lab3 PatchLab(const Measured_IT8& it8, int patch, bool fromXyz) const;
+    Lab PatchLab(const Measured_IT8& it8, int patch, bool fromXyz) const;
 
     // Profile slots.
     std::unique_ptr<CProfil> m_Outprof;

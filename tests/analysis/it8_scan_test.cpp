@@ -56,17 +56,17 @@ protected:
     ProgressLog log;
 };
 
-void ExpectLab(const Lab3& lab, double L, double a, double b, double tolerance = 1e-12) {
+void ExpectLab(const Lab& lab, double L, double a, double b, double tolerance = 1e-12) {
     EXPECT_NEAR(lab.L, L, tolerance);
     EXPECT_NEAR(lab.a, a, tolerance);
     EXPECT_NEAR(lab.b, b, tolerance);
 }
 
 // CIE Lab of XYZ (0..100) against a white, with the exact cube root.
-Lab3 CieLab(double X, double Y, double Z, const double white[3]) {
+Lab CieLab(double X, double Y, double Z, const double white[3]) {
     auto f = [](double r) { return r > 216.0 / 24389.0 ? std::cbrt(r) : (24389.0 / 27.0 * r + 16.0) / 116.0; };
     const double fx = f(X / 100 / white[0]), fy = f(Y / 100 / white[1]), fz = f(Z / 100 / white[2]);
-    return Lab3{116 * fy - 16, 500 * (fx - fy), 200 * (fy - fz)};
+    return Lab{116 * fy - 16, 500 * (fx - fy), 200 * (fy - fz)};
 }
 
 const char* const kCmykLab = "ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B";
@@ -172,14 +172,14 @@ TEST_F(It8Scan, XyzOnlyFilesAreConvertedAgainstD50WithoutAProfile) {
          {"1 0 0 0 0 96.42 100 82.49", "2 100 0 0 0 15 22 50", "3 0 0 0 0.5 80 84 70", "4 0 0 0 0 0.5 0.4 0.3"});
     const double d50[3] = {0.9642, 1.0, 0.8249};
     ExpectLab(tool.ScanIt8ForValues(it8, std::vector<double>{0, 0, 0, 0, 0, 0, 0}.data()), 100, 0, 0, 1e-9);
-    const Lab3 cyan = CieLab(15, 22, 50, d50);
+    const Lab cyan = CieLab(15, 22, 50, d50);
     ExpectLab(tool.ScanIt8ForValues(it8, std::vector<double>{100, 0, 0, 0, 0, 0, 0}.data()), cyan.L, cyan.a, cyan.b,
               1e-9);
     // A dark colour below the 0.008856 knee takes the linear part (7.787 r + 16/116).
-    const Lab3 dark = tool.MeasuredXyzToLab(0.5, 0.4, 0.3);
+    const Lab dark = tool.MeasuredXyzToLab(0.5, 0.4, 0.3);
     EXPECT_NEAR(dark.L, 116 * (7.787 * 0.004 + 16.0 / 116) - 16, 1e-12);
-    const Lab3 white = tool.ScanIt8ForWhitePoint(it8);
-    const Lab3 w1 = CieLab(96.42, 100, 82.49, d50), w2 = CieLab(80, 84, 70, d50), w4 = CieLab(0.5, 0.4, 0.3, d50);
+    const Lab white = tool.ScanIt8ForWhitePoint(it8);
+    const Lab w1 = CieLab(96.42, 100, 82.49, d50), w2 = CieLab(80, 84, 70, d50), w4 = CieLab(0.5, 0.4, 0.3, d50);
     EXPECT_NEAR(white.L, (w1.L + w2.L + w4.L) / 3, 0.01);
     EXPECT_NEAR(white.a, (w1.a + w2.a + w4.a) / 3, 0.01);
 }
@@ -202,8 +202,8 @@ TEST_F(It8Scan, XyzConversionTakesTheFirstLoadedProfilesIlluminant) {
     const double whiteD65[3] = {0.9505, 1.0, 1.089}, whiteA[3] = {1.0985, 1.0, 0.3558};
 
     load(*tool.m_ISDprof, a);
-    Lab3 lab = tool.MeasuredXyzToLab(40, 42, 30);
-    Lab3 expected = CieLab(40, 42, 30, whiteA);
+    Lab lab = tool.MeasuredXyzToLab(40, 42, 30);
+    Lab expected = CieLab(40, 42, 30, whiteA);
     ExpectLab(lab, expected.L, expected.a, expected.b, 0.02);
 
     load(*tool.m_Refprof, d65);  // the reference profile comes before the ISD profile
@@ -247,7 +247,7 @@ TEST_F(It8Scan, PaperWhiteOfTheCharacterisationData) {
             }
         }
         ASSERT_GT(count, 0) << name;
-        const Lab3 white = tool.ScanIt8ForWhitePoint(it8);
+        const Lab white = tool.ScanIt8ForWhitePoint(it8);
         ExpectLab(white, sum[0] / count, sum[1] / count, sum[2] / count, 1e-9);
     }
 }
