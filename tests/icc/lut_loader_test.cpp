@@ -166,3 +166,82 @@ TEST(LoadLut, ReleaseFreesAndMarks) {
     p.Release();
     EXPECT_FALSE(p.HoldsTables());
 }
+
+TEST(LoadLut, V4TablesReadTheirCurveElements) {
+    TempDir dir;
+    LutSpec lut = SmallCmykLut(3, 17, 300);
+    lut.inputCurves[2][5] = 1234;  // the channels stay apart
+    lut.outputCurves[1][10] += 1;
+    const std::string path = Write(dir, "v4.icc", IccBuilder("CMYK", "Lab ", "prtr", 0x04200000)
+                                                      .AddTag("A2B0", MabTag(lut))
+                                                      .AddTag("B2A0", MabTag(SmallCmykLut(3, 256, 2), true)));
+    CProfil p;
+    p.ReadTagTable(0, path);
+    ASSERT_EQ(p.LoadLut(0, "A2B1", path), 1);
+    EXPECT_EQ(p.m_Lut[0].type, "mAB ");
+    EXPECT_EQ(p.m_Precision[0], 3);
+    EXPECT_EQ(p.m_FileInputEntries[0], 17);
+    EXPECT_EQ(p.m_Lut[0].inputEntries, 256);
+    EXPECT_EQ(p.m_Lut[0].outputEntries, 300);
+    EXPECT_EQ(p.m_Clut[0], lut.clut);
+    EXPECT_EQ(p.m_InputCurves[0].size(), 4u * 256);
+    // Short curves are spread over 256 entries as "mft2" curves are; the last entry is the last sample.
+    EXPECT_EQ(p.m_InputCurves[0][2 * 256 + 255], 65535);
+    EXPECT_EQ(p.m_InputCurves[0][2 * 256 + 0], 0);
+    EXPECT_EQ(p.m_OutputCurves[0].size(), 3u * 300);
+    EXPECT_EQ(p.m_OutputCurves[0][300 + 299], 65535);
+    EXPECT_DOUBLE_EQ(p.m_OutputScale[0], 299.0 / 65535);
+    EXPECT_EQ(p.m_OutputIdentity[0], 0);  // one entry off the straight line
+    p.ReadTagTable(1, path);
+    ASSERT_EQ(p.LoadLut(1, "B2A0", path), 1);
+    EXPECT_EQ(p.m_Lut[1].type, "mBA ");
+    EXPECT_EQ(std::vector<uint16_t>(p.m_InputCurves[1].begin(), p.m_InputCurves[1].begin() + 256), LinearCurve(256));
+    EXPECT_EQ(p.m_OutputIdentity[1], 1);
+}
+
+TEST(LoadLut, MatrixTrcFromBuiltProfile) {
+    TempDir dir;
+    std::vector<uint16_t> sampled(20);
+    for (int k = 0; k < 20; ++k) sampled[static_cast<size_t>(k)] = static_cast<uint16_t>(65535.0 * k * k / 361);
+    const std::string path = Write(dir, "rgb.icc", IccBuilder("RGB ", "Lab ", "mntr")
+                                                       .AddTag("rXYZ", XyzTag(0.4361, 0.2225, 0.0139))
+                                                       .AddTag("gXYZ", XyzTag(0.3851, 0.7169, 0.0971))
+                                                       .AddTag("bXYZ", XyzTag(0.1431, 0.0606, 0.7141))
+                                                       .AddTag("rTRC", GammaCurvTag(2.2))
+                                                       .AddTag("gTRC", CurvTag(sampled))
+                                                       .AddTag("bTRC", CurvTag({})));
+    CProfil p;
+    EXPECT_EQ(LoadBoth(p, path, "A2B1", "B2A1"), 11);
+    EXPECT_EQ(p.m_Lut[0].type, "MATR");
+    EXPECT_EQ(p.m_Lut[0].pcs, "XYZ");  // an RGB matrix profile answers in XYZ whatever its header says
+    EXPECT_EQ(p.m_Lut[0].colorantCount, 3);
+    EXPECT_NEAR(p.m_Lut[0].matrix[1][1], 0.7169, 1e-4);
+    EXPECT_NEAR(p.m_Trc[0].gamma[0], 2.2, 1.0 / 256);
+    EXPECT_NEAR(p.m_Trc[0].curve[0][128], 255 * std::pow(128 / 255.0, p.m_Trc[0].gamma[0]), 1e-9);
+    EXPECT_EQ(p.m_Trc[0].curve[2][77], 77);
+    EXPECT_EQ(p.m_Trc[1].curve[2][77], 77);
+    EXPECT_NEAR(p.m_Trc[0].curve[1][128], 255.0 * 128 * 128 / 255 / 255, 0.7);
+    EXPECT_NEAR(p.m_Trc[1].curve[1][64], 255 * std::sqrt(64 / 255.0), 1.0);
+    EXPECT_TRUE(p.SlotHolds(0));
+    EXPECT_TRUE(p.SlotHolds(1));
+}
+
+TEST(LoadLut, PaperWhites) {
+    TempDir dir;
+    const std::string path = Write(dir, "p.icc", IccBuilder()
+                                                     .AddTag("wtpt", XyzTag(0.8570, 0.8850, 0.7030))
+                                                     .AddTag("A2B1", Mft2Tag(SmallCmykLut()))
+                                                     .AddTag("B2A1", Mft2Tag(SmallCmykLut())));
+    CProfil p;
+    p.m_UseMediaWhite[0] = 1;
+    EXPECT_EQ(LoadBoth(p, path, "A2B1", "B2A1"), 11);
+    const Lab white = p.WhiteLab(0);
+    EXPECT_NEAR(p.m_SlotWhite[0][0], white.L / 100, 1e-12);
+    EXPECT_EQ(p.m_PaperWhite[0][0], static_cast<int>(white.L * 2.55 + 0.5));
+    EXPECT_EQ(p.m_PaperWhite[0][1], static_cast<int>(white.a + 0.5));
+    EXPECT_EQ(p.m_PaperWhite[0][2], static_cast<int>(white.b + 0.5));
+    // Without the media white the direction-1 paper white is the colour space's own.
+    EXPECT_EQ(p.m_SlotWhite[1][0], 1.0);
+    EXPECT_EQ(p.m_PaperWhite[1][0], 0);
+    EXPECT_EQ(p.m_PaperWhite[1][3], 0);
+}

@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cmath>
 #include <filesystem>
+#include <fstream>
 #include <memory>
 
 #include "helpers/test_paths.h"
@@ -243,4 +244,77 @@ TEST(RealProfiles, ParametricCurvesFailCleanly) {
         EXPECT_FALSE(p.SlotHolds(0));
         EXPECT_FALSE(p.SlotHolds(1));
     }
+}
+
+namespace {
+
+// A v4 CMYK profile written by lcms2: "mAB " and "mBA " tables of curves, CLUT and curves.
+bool WriteLcmsV4Profile(const std::string& path) {
+    cmsHPROFILE profile = cmsCreateProfilePlaceholder(nullptr);
+    cmsSetProfileVersion(profile, 4.3);
+    cmsSetDeviceClass(profile, cmsSigOutputClass);
+    cmsSetColorSpace(profile, cmsSigCmykData);
+    cmsSetPCS(profile, cmsSigLabData);
+    auto curves = [](int channels, int entries, double gamma) {
+        std::vector<cmsToneCurve*> set;
+        std::vector<cmsUInt16Number> table(static_cast<size_t>(entries));
+        for (int k = 0; k < entries; ++k)
+            table[static_cast<size_t>(k)] = static_cast<cmsUInt16Number>(65535 * std::pow(k / (entries - 1.0), gamma) + 0.5);
+        for (int c = 0; c < channels; ++c) set.push_back(cmsBuildTabulatedToneCurve16(nullptr, static_cast<cmsUInt32Number>(entries), table.data()));
+        cmsStage* stage = cmsStageAllocToneCurves(nullptr, static_cast<cmsUInt32Number>(channels), set.data());
+        for (cmsToneCurve* curve : set) cmsFreeToneCurve(curve);
+        return stage;
+    };
+    auto sampler = [](const cmsUInt16Number in[], cmsUInt16Number out[], void* outputs) -> cmsInt32Number {
+        const int m = *static_cast<int*>(outputs);
+        for (int o = 0; o < m; ++o) out[o] = static_cast<cmsUInt16Number>((in[0] / 3 + in[1] / 5 + in[2] / 7 + 977 * o) & 0xFFFF);
+        return TRUE;
+    };
+    int three = 3, four = 4;
+    cmsPipeline* forward = cmsPipelineAlloc(nullptr, 4, 3);
+    cmsPipelineInsertStage(forward, cmsAT_END, curves(4, 200, 1.2));
+    cmsStage* clut = cmsStageAllocCLut16bit(nullptr, 7, 4, 3, nullptr);
+    cmsStageSampleCLut16bit(clut, sampler, &three, 0);
+    cmsPipelineInsertStage(forward, cmsAT_END, clut);
+    cmsPipelineInsertStage(forward, cmsAT_END, curves(3, 1024, 0.8));
+    cmsPipeline* backward = cmsPipelineAlloc(nullptr, 3, 4);
+    cmsPipelineInsertStage(backward, cmsAT_END, curves(3, 512, 1.0));
+    cmsStage* clut2 = cmsStageAllocCLut16bit(nullptr, 9, 3, 4, nullptr);
+    cmsStageSampleCLut16bit(clut2, sampler, &four, 0);
+    cmsPipelineInsertStage(backward, cmsAT_END, clut2);
+    cmsPipelineInsertStage(backward, cmsAT_END, curves(4, 300, 1.1));
+    const bool ok = cmsWriteTag(profile, cmsSigAToB0Tag, forward) && cmsWriteTag(profile, cmsSigBToA0Tag, backward) &&
+                    cmsSaveProfileToFile(profile, path.c_str());
+    cmsPipelineFree(forward);
+    cmsPipelineFree(backward);
+    cmsCloseProfile(profile);
+    return ok;
+}
+
+}  // namespace
+
+TEST(RealProfiles, LcmsWrittenV4TablesMatchLcms) {
+    TempDir dir;
+    const std::string path = dir.File("v4.icc");
+    ASSERT_TRUE(WriteLcmsV4Profile(path));
+    CProfil p;
+    p.ReadTagTable(0, path);
+    ASSERT_EQ(p.LoadLut(0, "A2B1", path), 1);  // falls back to A2B0
+    p.ReadTagTable(1, path);
+    ASSERT_EQ(p.LoadLut(1, "B2A0", path), 1);
+    EXPECT_EQ(p.m_Lut[0].type, "mAB ");
+    EXPECT_EQ(p.m_Lut[1].type, "mBA ");
+    EXPECT_EQ(p.m_Lut[0].gridPoints, 7);
+    EXPECT_EQ(p.m_Lut[1].gridPoints, 9);
+    ExpectSlotMatches(p, 0, ReadWithLcms(path, cmsSigAToB0Tag));
+    ExpectSlotMatches(p, 1, ReadWithLcms(path, cmsSigBToA0Tag));
+    // Written back unchanged, the file stays as it was.
+    const std::string before = [&path] {
+        std::ifstream in(path, std::ios::binary);
+        return std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+    }();
+    EXPECT_TRUE(p.WriteClut(0, path));
+    EXPECT_TRUE(p.WriteClut(1, path));
+    std::ifstream in(path, std::ios::binary);
+    EXPECT_EQ(std::string((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>()), before);
 }
