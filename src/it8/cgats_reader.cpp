@@ -41,8 +41,11 @@ int32_t* HeaderNumber(It8Header& header, const std::string& keyword) {
 
 int32_t Measured_IT8::ReadIt8(const std::string& path) {
     Reset();
-    std::error_code ignored;
-    if (std::filesystem::is_directory(path, ignored)) return kIt8CannotOpen;
+    // Only a regular file has an end: a directory, a device such as /dev/zero or a pipe is not a
+    // measurement file.
+    std::error_code error;
+    const std::filesystem::file_status status = std::filesystem::status(path, error);
+    if (!error && status.type() != std::filesystem::file_type::regular) return kIt8CannotOpen;
     std::ifstream in(path);
     if (!in.is_open()) return kIt8CannotOpen;
     const int32_t result = ReadOpened(in);

@@ -78,6 +78,12 @@ TEST(CgatsReaderFailures, MissingFileOrDirectoryCannotBeOpened) {
     ExpectEmpty(it8);
     EXPECT_EQ(it8.ReadIt8(dir.Path()), kIt8CannotOpen);
     EXPECT_EQ(it8.ReadIt8(""), kIt8CannotOpen);
+    // Devices never end; they are not measurement files.
+    for (const char* device : {"/dev/zero", "/dev/null", "/dev/urandom"}) {
+        if (std::filesystem::exists(device)) {
+            EXPECT_EQ(it8.ReadIt8(device), kIt8CannotOpen) << device;
+        }
+    }
 }
 
 TEST(CgatsReaderFailures, HugeAnnouncedSetCountsNeedTheRowsInTheFile) {
