@@ -107,6 +107,7 @@ int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::strin
     } else if (lut.colorantCount == 3 && m_Trc[slot].curve[0].size() == 256 && m_Trc[slot].curve[1].size() == 256 &&
                m_Trc[slot].curve[2].size() == 256) {
         // A matrix/TRC transform needs its three tone curves as well as its three colorants.
+        m_LoadedTag[direction] = 0;
         lut.tagIndex = 0;
         lut.type = "MATR";
         lut.inputChannels = lut.outputChannels = 3;

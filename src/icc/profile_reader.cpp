@@ -1,5 +1,6 @@
 #include <algorithm>
 #include <cstring>
+#include <new>
 
 #include "icc/icc_bytes.h"
 #include "icc/profil.h"
@@ -139,7 +140,11 @@ void CProfil::ReadTagTable(int direction, const std::string& path) {
 
     std::vector<TagEntry>& tags = m_Tags[direction];
     tags.clear();
-    tags.resize(count < kMaxTags ? count : kMaxTags);
+    try {
+        tags.resize(count < kMaxTags ? count : kMaxTags);
+    } catch (const std::bad_alloc&) {
+        return;
+    }
 
     // The illuminant is also the media white until a "wtpt" tag says otherwise.
     for (int axis = 0; axis < 3; ++axis) {
@@ -156,7 +161,12 @@ void CProfil::ReadTagTable(int direction, const std::string& path) {
 
     for (uint32_t i = 0; i < tags.size(); ++i) {
         // A tag that cannot be read whole ends the directory: it and the entries after it stay empty.
-        if (!ReadTag(file, direction, i, colorants)) {
+        bool read = false;
+        try {
+            read = ReadTag(file, direction, i, colorants);
+        } catch (const std::bad_alloc&) {
+        }
+        if (!read) {
             tags[i] = TagEntry{};
             return;
         }
