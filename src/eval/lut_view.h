@@ -1,0 +1,40 @@
+#pragma once
+
+#include <cstdint>
+
+namespace vantrel {
+
+// What the interpolation kernels read of one loaded lookup-table slot: counts, scales and
+// the unpacked 16-bit curves and grid. A view owns nothing; it points into the profile.
+struct LutView {
+    int inputs = 0;         // n
+    int outputs = 0;        // m
+    int inputEntries = 0;   // E, entries per input curve (256 or more)
+    int outputEntries = 0;  // O, entries per output curve
+    int grid = 0;           // G, grid points per dimension
+    double gridScale = 0;    // input-curve value to grid coordinate
+    double outputScale = 0;  // grid value to output-curve position
+    bool outputIdentity = false;
+    const uint16_t* inputCurves = nullptr;   // n x E, channel-major
+    const uint16_t* clut = nullptr;          // G^n x m, first input slowest
+    const uint16_t* outputCurves = nullptr;  // m x O, channel-major
+    const int32_t* clutStrides = nullptr;    // per input channel: G^(n-1-i) x m
+    const int32_t* cornerOffsets = nullptr;  // 2^n cell corners, by raised-channel count then channel
+
+    // The output curves act only when they are long enough to be real curves and are not the identity.
+    bool UsesOutputCurves() const { return outputEntries >= 256 && !outputIdentity; }
+};
+
+// The working fields an evaluation writes: they live in the profile being evaluated.
+struct KernelScratch {
+    static constexpr int kVectorSize = 20;
+    static constexpr int kMaxCorners = 128;
+
+    double* vector = nullptr;      // 20: inputs on 0..255 in, outputs in table units out
+    int32_t* index = nullptr;      // 20: grid index per input channel
+    double* fraction = nullptr;    // 20: fraction inside the cell per input channel
+    double* complement = nullptr;  // 20: 1 - fraction
+    double* weights = nullptr;     // 128: corner weights of the multilinear kernel
+};
+
+}  // namespace vantrel
