@@ -64,9 +64,10 @@ inline int32_t LocateKernelCell(const LutView& t, KernelScratch& s) {
     int32_t base = 0;
     for (int i = 0; i < t.inputs; ++i) {
         const double g = GridCoordinate(t, i, s.vector[i], true);
-        SplitGridCoordinate(t, g, s.index[i], s.fraction[i]);
-        s.complement[i] = 1.0 - s.fraction[i];
-        base += s.index[i] * t.clutStrides[i];
+        WorkRecord& r = s.records[i];
+        SplitGridCoordinate(t, g, r.index, r.fraction);
+        s.complement[i] = 1.0 - r.fraction;
+        base += r.index * t.clutStrides[i];
     }
     return base;
 }

@@ -2,6 +2,8 @@
 
 #include <cstdint>
 
+#include "icc/profil.h"
+
 namespace vantrel {
 
 // What the interpolation kernels read of one loaded lookup-table slot: counts, scales and
@@ -31,8 +33,7 @@ struct KernelScratch {
     static constexpr int kMaxCorners = 128;
 
     double* vector = nullptr;      // 20: inputs on 0..255 in, outputs in table units out
-    int32_t* index = nullptr;      // 20: grid index per input channel
-    double* fraction = nullptr;    // 20: fraction inside the cell per input channel
+    WorkRecord* records = nullptr; // 20: grid index and fraction per input channel
     double* complement = nullptr;  // 20: 1 - fraction
     double* weights = nullptr;     // 128: corner weights of the multilinear kernel
 };

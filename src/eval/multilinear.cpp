@@ -34,7 +34,7 @@ void InterpolateMultilinear(const LutView& t, KernelScratch& s) {
     for (int k = 0; k < corners; ++k) {
         const unsigned mask = CornerOrder::Mask(n, k);
         double w = 1.0;
-        for (int i = 0; i < n; ++i) w *= ((mask >> i) & 1u) ? s.fraction[i] : s.complement[i];
+        for (int i = 0; i < n; ++i) w *= ((mask >> i) & 1u) ? s.records[i].fraction : s.complement[i];
         s.weights[k] = w;
     }
 

@@ -163,12 +163,14 @@ void Simplex4(const LutView& t, int32_t base, const double* f, SimplexWalk& walk
 void InterpolateSimplex(const LutView& t, KernelScratch& s) {
     if (t.inputs < 1 || t.inputs > 4 || t.outputs < 1 || t.outputs > KernelScratch::kVectorSize) return;
     const int32_t base = LocateKernelCell(t, s);
+    double f[4];
+    for (int i = 0; i < t.inputs; ++i) f[i] = s.records[i].fraction;
     SimplexWalk walk;
     switch (t.inputs) {
-        case 1: Simplex1(t, base, s.fraction, walk); break;
-        case 2: Simplex2(t, base, s.fraction, walk); break;
-        case 3: Simplex3(t, base, s.fraction, walk); break;
-        default: Simplex4(t, base, s.fraction, walk); break;
+        case 1: Simplex1(t, base, f, walk); break;
+        case 2: Simplex2(t, base, f, walk); break;
+        case 3: Simplex3(t, base, f, walk); break;
+        default: Simplex4(t, base, f, walk); break;
     }
     Finish(t, walk, s.vector);
 }

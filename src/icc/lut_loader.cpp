@@ -104,6 +104,10 @@ int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::strin
         lut.inputEntries = entry.inputEntries;
         lut.outputEntries = entry.outputEntries;
         lut.gridPoints = entry.gridPoints;
+        // The XYZ input matrix is the loaded table's own (a B2A0 may carry one where B2A1 has
+        // none); v4 tables held here have no matrix.
+        const bool v2Lut = entry.type == "mft1" || entry.type == "mft2";
+        for (int k = 0; k < 9; ++k) lut.matrix[k / 3][k % 3] = v2Lut ? entry.matrix[k] : (k % 4 == 0 ? 1.0 : 0.0);
     } else if (lut.colorantCount == 3 && m_Trc[slot].curve[0].size() == 256 && m_Trc[slot].curve[1].size() == 256 &&
                m_Trc[slot].curve[2].size() == 256) {
         // A matrix/TRC transform needs its three tone curves as well as its three colorants.

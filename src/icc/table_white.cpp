@@ -1,11 +1,15 @@
 #include "icc/table_white.h"
 
+#include "eval/interpolation.h"
 #include "icc/profil.h"
 
 namespace vantrel {
 
-// The interpolation kernels arrive with the evaluation code; until then the paper white of a
-// PCS-to-device table is not evaluated.
-bool EvaluateTableWhite(CProfil& /*profile*/) { return false; }
+// The PCS white through the slot-1 table with the kernel that table calls for.
+bool EvaluateTableWhite(CProfil& profile) {
+    if (SlotView(profile, 1).inputs < 1) return false;
+    InterpolateSlot(profile, 1);
+    return true;
+}
 
 }  // namespace vantrel

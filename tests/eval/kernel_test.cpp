@@ -19,11 +19,10 @@ using test::RandomLut;
 
 struct Scratch {
     double vector[20] = {};
-    int32_t index[20] = {};
-    double fraction[20] = {};
+    WorkRecord records[20] = {};
     double complement[20] = {};
     double weights[128] = {};
-    KernelScratch View() { return {vector, index, fraction, complement, weights}; }
+    KernelScratch View() { return {vector, records, complement, weights}; }
 };
 
 struct Cell {
@@ -231,8 +230,8 @@ TEST(Kernels, AllInputsAt255ReadOnlyTheLastNodeAndAt0TheFirst) {
             Scratch s;
             const auto top = Evaluate(kernel, t, std::vector<double>(n, 255.0), s);
             for (int i = 0; i < n; ++i) {
-                EXPECT_EQ(s.index[i], t.G - 1);
-                EXPECT_EQ(s.fraction[i], 0.0);
+                EXPECT_EQ(s.records[i].index, t.G - 1);
+                EXPECT_EQ(s.records[i].fraction, 0.0);
             }
             // Only the last node contributes; the simplex kernel maps it through the curves per
             // corner, the multilinear one after summing: the same for a single corner.
@@ -258,12 +257,12 @@ TEST(Kernels, GridFractionAboveTheSnapLimitMovesToTheNextNode) {
     // Grid coordinate 2.9985 on channel 1 lands on node 3; 2.9975 stays inside cell 2.
     auto input = [](double g) { return g * 255.0 / 8.0; };
     Evaluate(Kernel::Simplex, t, {0.0, input(2.9985), 0.0}, s);
-    EXPECT_EQ(s.index[1], 3);
-    EXPECT_EQ(s.fraction[1], 0.0);
+    EXPECT_EQ(s.records[1].index, 3);
+    EXPECT_EQ(s.records[1].fraction, 0.0);
     ExpectNear(std::vector<double>(s.vector, s.vector + 3), NodeValue(t, {0, 3, 0}, true), "snapped");
     Evaluate(Kernel::Multilinear, t, {0.0, input(2.9975), 0.0}, s);
-    EXPECT_EQ(s.index[1], 2);
-    EXPECT_NEAR(s.fraction[1], 0.9975, 1e-9);
+    EXPECT_EQ(s.records[1].index, 2);
+    EXPECT_NEAR(s.records[1].fraction, 0.9975, 1e-9);
 }
 
 TEST(Kernels, InputPositionAboveTheSnapLimitMovesToTheNextCurveEntry) {

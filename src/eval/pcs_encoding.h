@@ -1,0 +1,51 @@
+#pragma once
+
+#include <cstring>
+#include <string>
+
+#include "icc/profil.h"
+
+namespace vantrel {
+
+// XYZ with white Y = 1 to the 0..255 units of a table (32768 x 255 / 65535), and the same for
+// XYZ on the 0..100 scale.
+constexpr double kXyzToTable = 127.50194552529183;
+constexpr double kXyz100ToTable = 1.2750194552529184;
+constexpr double kLightnessScale = 2.55;
+
+inline double Clamp(double v, double lo, double hi) { return v < lo ? lo : (v > hi ? hi : v); }
+
+inline bool IsXyzPcs(const LutSlot& lut) { return lut.pcs.size() >= 3 && std::memcmp(lut.pcs.data(), "XYZ", 3) == 0; }
+inline bool IsMatrixTrc(const LutSlot& lut) { return lut.type.size() == 4 && std::memcmp(lut.type.data(), "MATR", 4) == 0; }
+// True when the four-character data colour space matches; "RGB" also matches "RGB ".
+inline bool SpaceIs(const std::string& space, const char* four) {
+    const size_t n = std::strlen(four);
+    if (space.size() >= n) return std::memcmp(space.data(), four, n) == 0;
+    return n == 4 && four[3] == ' ' && space.size() == 3 && std::memcmp(space.data(), four, 3) == 0;
+}
+
+// The a*, b* offset of a table's Lab encoding: 128 for 8-bit tables, 127.5 for 16-bit ones.
+inline double LabHalf(const CProfil& p, int slot) { return p.m_Precision[slot] >= 1 ? 127.5 : 128.0; }
+
+// Brings the first `count` outputs of a 16-bit table onto 0..255.
+inline void ScaleTableOutputs(CProfil& p, int slot, int count) {
+    if (p.m_Precision[slot] == 0) return;
+    for (int j = 0; j < count; ++j) p.m_Eval[j] *= CProfil::kInv257;
+}
+
+// Decodes three PCS values of the direction-0 table (on 0..255) into scaled Lab in lab[0..2],
+// absolute when direction 0 uses the media white. L* x 2.55 is limited to 255 from above only.
+void DecodeDirection0(const CProfil& p, const double* table, double* lab);
+
+// Clamps the scaled Lab in lab[0..2] in place and puts its encoding for the direction-1 table
+// into the evaluation vector (relative to the media white when direction 1 uses it). With
+// xyzPath, an "XYZ" table gets XYZ through its matrix; without, every table gets Lab (the
+// inverse matrix/TRC path decodes Lab itself).
+void EncodeForDirection1(CProfil& p, double* lab, bool xyzPath);
+
+// Encodes a scaled Lab for storing at a node of slot s (the node writers and the grid location
+// of PCS-input slots): clamped, relative when the direction uses the media white, in 0..255
+// table units. aLow is the lowest a*, b* accepted.
+void EncodeForNode(const CProfil& p, int slot, const double* lab, double aLow, double* table);
+
+}  // namespace vantrel

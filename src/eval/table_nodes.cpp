@@ -1,0 +1,289 @@
+#include "eval/table_nodes.h"
+
+#include <cmath>
+#include <cstdlib>
+
+#include "colour/colour_math.h"
+#include "eval/grid_coordinate.h"
+#include "eval/interpolation.h"
+#include "eval/node_index.h"
+#include "eval/pcs_encoding.h"
+#include "icc/profil.h"
+
+namespace vantrel {
+namespace {
+
+constexpr int kFirstIndexField = 4;
+// NodePcsValue tries input values 0, 0.1, .. 254.9.
+constexpr int kCandidates = 2550;
+
+// Output curve j of a slot at a CLUT value, interpolated between entries.
+double OutputCurveAt(const LutView& t, int j, double value) {
+    const int first = j * t.outputEntries;
+    const int last = first + t.outputEntries - 1;
+    const double q = value * t.outputScale + first;
+    int k = static_cast<int>(q);
+    if (k < first) k = first;
+    if (k > last) k = last;
+    const double u = q - k;
+    const uint16_t* c = t.outputCurves;
+    if (u > 0.0 && k < last) return c[k] + (c[k + 1] - c[k]) * u;
+    return c[k];
+}
+
+// The input value x (a multiple of 0.1) whose grid coordinate lies closest to `index` among
+// those that round to it; the first such on ties.
+double InputForNode(const LutView& t, int channel, int index) {
+    auto coordinate = [&](int k) { return GridCoordinate(t, channel, k / 10.0, true); };
+    const uint16_t* curve = t.inputCurves + channel * t.inputEntries;
+    bool rising = true;
+    for (int k = 1; k < t.inputEntries && rising; ++k) rising = curve[k] >= curve[k - 1];
+
+    int from = 0;
+    if (rising) {
+        // A rising curve reaches the node's neighbourhood in one stretch: find where it starts.
+        int lo = 0, hi = kCandidates;
+        while (lo < hi) {
+            const int mid = (lo + hi) / 2;
+            if (coordinate(mid) + 0.5 < index) {
+                lo = mid + 1;
+            } else {
+                hi = mid;
+            }
+        }
+        from = lo > 0 ? lo - 1 : 0;
+    }
+    int bestK = -1;
+    double bestDistance = 0.0;
+    int closestK = 0;
+    double closest = -1.0;
+    for (int k = from; k < kCandidates; ++k) {
+        const double g = coordinate(k);
+        const double d = (g - index) * (g - index);
+        if (closest < 0.0 || d < closest) {
+            closest = d;
+            closestK = k;
+        }
+        if (static_cast<int>(g + 0.5) == index) {
+            if (bestK < 0 || d < bestDistance) {
+                bestK = k;
+                bestDistance = d;
+            }
+        } else if (rising && g > index) {
+            break;  // past the node on a rising curve: nothing later rounds to it
+        }
+    }
+    // A curve that skips the node entirely gives the closest value it reaches.
+    return (bestK >= 0 ? bestK : closestK) / 10.0;
+}
+
+// Cramer's rule for m x = y; a singular matrix leaves y as it is.
+void SolveMatrix(const double (&m)[3][3], const double* y, double* x) {
+    auto det3 = [](double a, double b, double c, double d, double e, double f, double g, double h, double i) {
+        return a * (e * i - f * h) - b * (d * i - f * g) + c * (d * h - e * g);
+    };
+    const double det = det3(m[0][0], m[0][1], m[0][2], m[1][0], m[1][1], m[1][2], m[2][0], m[2][1], m[2][2]);
+    if (std::fabs(det) < 1e-300 || !std::isfinite(det)) {
+        for (int k = 0; k < 3; ++k) x[k] = y[k];
+        return;
+    }
+    x[0] = det3(y[0], m[0][1], m[0][2], y[1], m[1][1], m[1][2], y[2], m[2][1], m[2][2]) / det;
+    x[1] = det3(m[0][0], y[0], m[0][2], m[1][0], y[1], m[1][2], m[2][0], y[2], m[2][2]) / det;
+    x[2] = det3(m[0][0], m[0][1], y[0], m[1][0], m[1][1], y[1], m[2][0], m[2][1], y[2]) / det;
+}
+
+// Decodes three PCS values of slot s (0..255) into scaled Lab, absolute when the direction
+// uses the media white; L* x 2.55 unclamped.
+void DecodeNodePcs(const CProfil& p, int slot, const double* t, double* lab) {
+    Lab out;
+    if (IsXyzPcs(p.m_Lut[slot])) {
+        XYZ xyz{t[0] / kXyzToTable, t[1] / kXyzToTable, t[2] / kXyzToTable};
+        if (p.m_UseMediaWhite[slot]) xyz = p.AdaptToAbsolute(xyz.X, xyz.Y, xyz.Z, slot);
+        out = p.XYZToLab(xyz.X, xyz.Y, xyz.Z);
+    } else {
+        const double half = LabHalf(p, slot);
+        out = Lab{t[0] / kLightnessScale, t[1] - half, t[2] - half};
+        if (p.m_UseMediaWhite[slot]) out = p.LabToAbsolute(out.L, out.a, out.b, slot);
+    }
+    lab[0] = out.L * kLightnessScale;
+    lab[1] = out.a;
+    lab[2] = out.b;
+}
+
+bool SixteenBit(const CProfil& p, int slot) { return p.m_Precision[slot] != 0; }
+
+uint16_t Store(double value, double bound) {
+    if (!(value > 0.0)) return 0;
+    if (value >= bound) return static_cast<uint16_t>(bound);
+    return static_cast<uint16_t>(value);
+}
+
+// First record field of the node indices of a slot-1 node.
+int DeviceIndexField(int inputs) { return inputs >= 4 ? inputs : kFirstIndexField; }
+
+}  // namespace
+
+void NodePcsValue(CProfil& p, double* record) {
+    const LutView t = SlotView(p, 1);
+    if (t.inputs < 1) return;
+    double x[4] = {0, 0, 0, 0};
+    const int channels = t.inputs < 4 ? t.inputs : 4;
+    for (int c = 0; c < channels; ++c) {
+        const int wanted = RoundedIndex(record[c], t.grid);
+        x[c] = InputForNode(t, c, wanted);
+    }
+    if (t.inputs >= 4) {
+        for (int c = 0; c < 4; ++c) record[c] = x[c];
+        return;
+    }
+    const LutSlot& lut = p.m_Lut[1];
+    Lab lab;
+    if (IsXyzPcs(lut)) {
+        const double y[3] = {x[0] * 257.0 / 327.68, x[1] * 257.0 / 327.68, x[2] * 257.0 / 327.68};
+        double xyz[3];
+        SolveMatrix(lut.matrix, y, xyz);
+        XYZ v{xyz[0] / 100.0, xyz[1] / 100.0, xyz[2] / 100.0};
+        if (p.m_UseMediaWhite[1]) v = p.AdaptToAbsolute(v.X, v.Y, v.Z, 1);
+        lab = p.XYZToLab(v.X, v.Y, v.Z);
+    } else {
+        const double half = LabHalf(p, 1);
+        lab = Lab{x[0] / kLightnessScale, x[1] - half, x[2] - half};
+        if (p.m_UseMediaWhite[1]) lab = p.LabToAbsolute(lab.L, lab.a, lab.b, 1);
+    }
+    record[0] = lab.L * kLightnessScale;
+    record[1] = lab.a;
+    record[2] = lab.b;
+}
+
+int ReadNodeLab(CProfil& p, double* record, int slot, bool throughCurves) {
+    const LutView t = SlotView(p, slot);
+    if (t.inputs < 1 || t.outputs < 3) return 1;
+    const int32_t node = NodeOffset(t, record + kFirstIndexField, true);
+    double v[3];
+    for (int j = 0; j < 3; ++j) {
+        v[j] = t.clut[node + j];
+        if (throughCurves && t.outputEntries >= 256) v[j] = OutputCurveAt(t, j, v[j]);
+        if (SixteenBit(p, slot)) v[j] *= CProfil::kInv257;
+    }
+    DecodeNodePcs(p, slot, v, record);
+    return 1;
+}
+
+int WriteNodeLab(CProfil& p, double* record, int slot) {
+    const LutView t = SlotView(p, slot);
+    if (t.inputs < 1) return 1;
+    const int32_t node = NodeOffset(t, record + kFirstIndexField, true);
+    double v[4] = {0, 0, 0, 0};
+    EncodeForNode(p, slot, record, -127.5, v);
+    const bool wide = SixteenBit(p, slot);
+    const double bound = wide ? 65535.0 : 255.0;
+    uint16_t* clut = p.m_Clut[slot].data();
+    for (int j = 0; j < t.outputs; ++j) {
+        const double value = j < 4 ? (wide ? v[j] * 257.0 + 0.5 : v[j] + 0.5) : 0.0;
+        clut[node + j] = Store(value, bound);
+    }
+    return 1;
+}
+
+int WriteNodeChannelLab(CProfil& p, double* record, int slot) {
+    const LutView t = SlotView(p, slot);
+    if (t.inputs < 1) return 1;
+    const LutSlot& lut = p.m_Lut[slot];
+    const int32_t node = NodeOffset(t, record + kFirstIndexField, false);
+    const int channel = static_cast<int>(record[3]);
+    const bool wide = SixteenBit(p, slot);
+    const double bound = wide ? 65535.0 : 255.0;
+    uint16_t* clut = p.m_Clut[slot].data();
+
+    Lab in{Clamp(record[0], 0.0, 255.0) / kLightnessScale, Clamp(record[1], -128.0, 127.0),
+           Clamp(record[2], -128.0, 127.0)};
+    if (IsXyzPcs(lut)) {
+        XYZ xyz = p.LabToXYZ(in.L, in.a, in.b);
+        if (p.m_UseMediaWhite[slot]) xyz = p.AdaptToRelative(xyz.X, xyz.Y, xyz.Z, slot);
+        const double v[3] = {xyz.X * kXyzToTable, xyz.Y * kXyzToTable, xyz.Z * kXyzToTable};
+        for (int j = 0; j < 3 && j < t.outputs; ++j) clut[node + j] = Store(wide ? v[j] * 257.0 : v[j] + 0.5, bound);
+        return 1;
+    }
+    if (channel < 0 || channel > 2 || channel >= t.outputs) return 1;
+    if (p.m_UseMediaWhite[slot]) in = p.LabToRelative(in.L, in.a, in.b, slot);
+    const double half = LabHalf(p, slot);
+    double v[3] = {in.L * kLightnessScale, in.a + half, in.b + half};
+    if (v[channel] < 0.0) v[channel] = 0.0;
+    double stored;
+    if (!wide) {
+        stored = v[channel] + 0.5;
+    } else if (t.inputs >= 4) {
+        stored = v[channel] * 257.0;
+    } else {
+        stored = v[channel] * 257.0 + 0.5;
+    }
+    clut[node + channel] = Store(stored, bound);
+    return 1;
+}
+
+int ReadNodeDevice(CProfil& p, double* record, bool throughCurves) {
+    const LutView t = SlotView(p, 1);
+    if (t.inputs < 1) return 1;
+    const int32_t node = NodeOffset(t, record + DeviceIndexField(t.inputs), true);
+    const bool wide = SixteenBit(p, 1);
+    for (int j = 0; j < t.outputs; ++j) {
+        double v = t.clut[node + j];
+        if (throughCurves) v = OutputCurveAt(t, j, v);
+        if (wide) v *= CProfil::kInv257;
+        record[j] = v;
+    }
+    return 1;
+}
+
+namespace {
+
+// The CLUT value k whose image through output curve j (interpolated, truncated) is `wanted`:
+// halving steps while far off, then single steps up and down. A flat stretch at zero leaves k
+// at its upper end, a flat stretch at the top at its lower end.
+int32_t ValueForCurve(const LutView& t, int j, int32_t wanted, int32_t bound) {
+    auto image = [&](int32_t k) { return static_cast<int32_t>(OutputCurveAt(t, j, k)); };
+    constexpr int32_t kFar = 4097;
+    constexpr int kMaxHalvings = 100;
+    constexpr int kMaxFlatSteps = 4096;
+    int32_t k = wanted;
+    int32_t previous = 0;
+    bool havePrevious = false;
+    for (int steps = 0; steps < kMaxHalvings; ++steps) {
+        const int32_t diff = wanted - image(k);
+        if (std::abs(diff) < kFar || k == 0 || k == bound) break;
+        if (havePrevious && diff == -previous - 1) break;  // swinging back and forth
+        previous = diff;
+        havePrevious = true;
+        k += diff / 2;
+        if (k < 0) k = 0;
+        if (k > bound) k = bound;
+    }
+    int flat = 0;
+    while (k < bound && (image(k) < wanted || (image(k) == wanted && wanted == 0 && flat++ < kMaxFlatSteps))) ++k;
+    flat = 0;
+    while (k > 0 && (image(k) > wanted || (image(k) == wanted && wanted == bound && flat++ < kMaxFlatSteps))) --k;
+    return k;
+}
+
+}  // namespace
+
+int WriteNodeDevice(CProfil& p, double* record, bool throughCurves) {
+    const LutView t = SlotView(p, 1);
+    if (t.inputs < 1) return 1;
+    const int32_t node = NodeOffset(t, record + DeviceIndexField(t.inputs), true);
+    const bool wide = SixteenBit(p, 1);
+    const int32_t bound = wide ? 65535 : 255;
+    uint16_t* clut = p.m_Clut[1].data();
+    const int outputs = t.outputs < 7 ? t.outputs : 7;
+    for (int j = 0; j < outputs; ++j) {
+        const double value = j < 4 ? record[j] : record[j + 10];
+        const double scaled = wide ? value * 257.0 : value + 0.5;
+        int32_t target = 0;
+        if (scaled > 0.0) target = scaled >= bound ? bound : static_cast<int32_t>(scaled);
+        const int32_t k = throughCurves ? ValueForCurve(t, j, target, bound) : target;
+        clut[node + j] = static_cast<uint16_t>(k);
+    }
+    return 1;
+}
+
+}  // namespace vantrel
