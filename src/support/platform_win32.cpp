@@ -1,0 +1,48 @@
+#if defined(_WIN32)
+
+#include "support/platform.h"
+
+#ifndef WIN32_LEAN_AND_MEAN
+#define WIN32_LEAN_AND_MEAN
+#endif
+#include <windows.h>
+
+namespace vantrel::platform {
+
+const char* ParameterFilePath() { return "c:/temp/vantrelparams.txt"; }
+const char* IsdProfilePath() { return "c:/temp/vantrel.isd"; }
+
+namespace {
+
+// The identity profiles live in the library's own file as resources of this type.
+constexpr wchar_t kProfileResourceType[] = L"ICCPROFILE";
+
+HMODULE Handle(void* module) { return static_cast<HMODULE>(module); }
+
+}  // namespace
+
+// Loading the library by its own name finds the copy the host already loaded and
+// only raises its reference count; the destructor gives that reference back.
+ModuleResources::ModuleResources() : module_(LoadLibraryW(L"vantrel.dll")) {}
+
+ModuleResources::~ModuleResources() {
+    if (module_) FreeLibrary(Handle(module_));
+}
+
+std::vector<uint8_t> ModuleResources::Profile(int id) const {
+    if (!module_) return {};
+    HRSRC resource = FindResourceW(Handle(module_), MAKEINTRESOURCEW(id), kProfileResourceType);
+    if (!resource) return {};
+    HGLOBAL loaded = LoadResource(Handle(module_), resource);
+    if (!loaded) return {};
+    const void* data = LockResource(loaded);
+    if (!data) return {};
+    const DWORD size = SizeofResource(Handle(module_), resource);
+    if (size < 1) return {};
+    const auto* bytes = static_cast<const uint8_t*>(data);
+    return std::vector<uint8_t>(bytes, bytes + size);
+}
+
+}  // namespace vantrel::platform
+
+#endif

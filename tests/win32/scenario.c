@@ -1,0 +1,232 @@
+/* The scenario both builds run; see scenario.h. Output is plain text, integers only, so
+ * that the two transcripts compare byte for byte whatever the platform's C library. */
+#include "scenario.h"
+
+#include <stdint.h>
+#include <stdlib.h>
+#include <string.h>
+
+const char* const kVantrelExportNames[VANTREL_EXPORT_COUNT] = {
+    "dllInit",   "dllFree",        "analyse1",           "optimize1", "analyse2",       "optimize2",
+    "analyse3",  "optimize3",      "Cmyk2Lab_Double",    "analyse4",  "Cmykrgb2Lab_Double", "optimize4",
+    "RGB2Lab_Double", "mergeMCHintoCMYK"};
+
+const char* const kVantrelIdentityFiles[VANTREL_IDENTITY_FILE_COUNT] = {
+    "neutral.3cc", "cmyk2cmyk5neutral.mcc", "cmykog2cmykog5neutral.mcc", "cmykrgb2cmykrgb5neutral.mcc"};
+
+/* Outputs are filled with this before a call, so that a value the library left alone shows. */
+#define UNTOUCHED (-777)
+/* Most records one conversion call of the scenario passes. */
+#define MAX_RECORDS 32
+
+typedef struct Digest {
+    uint64_t hash;
+    unsigned long count;
+} Digest;
+
+static void DigestBytes(Digest* d, const void* data, size_t n) {
+    const unsigned char* p = (const unsigned char*)data;
+    for (size_t i = 0; i < n; ++i) {
+        d->hash ^= p[i];
+        d->hash *= 1099511628211u; /* FNV-1a, 64 bit */
+    }
+}
+
+static void DigestReset(Digest* d) {
+    d->hash = 14695981039346656037u;
+    d->count = 0;
+}
+
+static void PrintDigest(FILE* out, const Digest* d) {
+    fprintf(out, "%08lx%08lx", (unsigned long)(d->hash >> 32), (unsigned long)(d->hash & 0xFFFFFFFFu));
+}
+
+/* Progress calls during one export: how many, and a digest of their texts and steps. The
+ * callback has no context argument, so the scenario keeps the tally here. */
+static Digest g_progress;
+
+static int VANTREL_CALL OnProgress(const char* text, int step, int steps) {
+    ++g_progress.count;
+    if (text) DigestBytes(&g_progress, text, strlen(text) + 1);
+    DigestBytes(&g_progress, &step, sizeof step);
+    DigestBytes(&g_progress, &steps, sizeof steps);
+    return 0;
+}
+
+static void ProgressLine(FILE* out) {
+    fprintf(out, "  progress calls=%lu digest=", g_progress.count);
+    PrintDigest(out, &g_progress);
+    fputc('\n', out);
+    DigestReset(&g_progress);
+}
+
+static int g_failures;
+
+static void Check(int ok, const char* what) {
+    if (!ok) {
+        fprintf(stderr, "FAILED: %s\n", what);
+        ++g_failures;
+    }
+}
+
+static char* Join(const char* dir, const char* name) {
+    size_t n = strlen(dir) + strlen(name) + 1;
+    char* path = (char*)malloc(n);
+    if (path) snprintf(path, n, "%s%s", dir, name);
+    return path;
+}
+
+/* Size and digest of a file, or "missing". Returns the size, -1 when missing. */
+static long FileLine(FILE* out, const char* dir, const char* name) {
+    char* path = Join(dir, name);
+    FILE* f = path ? fopen(path, "rb") : NULL;
+    free(path);
+    if (!f) {
+        fprintf(out, "file %s missing\n", name);
+        return -1;
+    }
+    Digest d;
+    DigestReset(&d);
+    unsigned char buffer[65536];
+    long size = 0;
+    size_t got;
+    while ((got = fread(buffer, 1, sizeof buffer, f)) > 0) {
+        DigestBytes(&d, buffer, got);
+        size += (long)got;
+    }
+    fclose(f);
+    fprintf(out, "file %s size=%ld fnv1a=", name, size);
+    PrintDigest(out, &d);
+    fputc('\n', out);
+    return size;
+}
+
+static int Exists(const char* dir, const char* name) {
+    char* path = Join(dir, name);
+    FILE* f = path ? fopen(path, "rb") : NULL;
+    free(path);
+    if (f) fclose(f);
+    return f != NULL;
+}
+
+static void InitWithDirectory(const VantrelApi* api, const char* label, const char* dir, FILE* out) {
+    void* handle = NULL;
+    int rc = api->dllInit(OnProgress, &handle, dir);
+    fprintf(out, "dllInit(%s) = %d handle=%s\n", label, rc, handle ? "set" : "null");
+    ProgressLine(out);
+    Check(rc == 0 && handle != NULL, "dllInit gives a handle");
+    if (handle) fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+}
+
+static void IdentityFiles(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
+    InitWithDirectory(api, "null dir", NULL, out);
+    InitWithDirectory(api, "empty dir", "", out);
+
+    InitWithDirectory(api, "work dir", paths->work, out);
+    for (int i = 0; i < VANTREL_IDENTITY_FILE_COUNT; ++i) {
+        long size = FileLine(out, paths->work, kVantrelIdentityFiles[i]);
+        Check(size > 0, "an identity profile is written");
+        if (i == 0) Check(size == 714612, "neutral.3cc has its size");
+    }
+
+    /* The directory is a prefix: without a trailing separator the names run on. */
+    char* prefix = Join(paths->work, "prefix-");
+    if (!prefix) return;
+    InitWithDirectory(api, "work dir + \"prefix-\"", prefix, out);
+    free(prefix);
+    for (int i = 0; i < VANTREL_IDENTITY_FILE_COUNT; ++i) {
+        char* name = Join("prefix-", kVantrelIdentityFiles[i]);
+        if (name) FileLine(out, paths->work, name);
+        free(name);
+    }
+}
+
+static void NullHandles(const VantrelApi* api, FILE* out) {
+    int a = UNTOUCHED, b = UNTOUCHED, c = UNTOUCHED, d = UNTOUCHED;
+    int lab[3] = {0, 0, 0}, values[7] = {0, 0, 0, 0, 0, 0, 0};
+    unsigned short table[8] = {0};
+    fprintf(out, "null handle: dllFree=%d analyse1=%d optimize1=%d analyse2=%d optimize2=%d\n",
+            api->dllFree(NULL), api->analyse1(NULL, "p.icc", lab, values), api->optimize1(NULL, "p.icc", &a, &b),
+            api->analyse2(NULL, "i.isd", "o.it8", "m.it8", &a, &b), api->optimize2(NULL, "o.icc", &a, &b, 0));
+    fprintf(out, "null handle: optimize3=%d analyse4=%d optimize4=%d mergeMCHintoCMYK=%d\n",
+            api->optimize3(NULL, "o.3cc", &a, &b, 0),
+            api->analyse4(NULL, "p.icc", "r.icc", "r.it8", "m.it8", &a, &b, &c, &d),
+            api->optimize4(NULL, "o.mcc", &a, &b, table, "", 0),
+            api->mergeMCHintoCMYK(NULL, "r.icc", "p.icc", "o.icc"));
+    fprintf(out, "null handle outputs: %d %d %d %d\n", a, b, c, d);
+    Check(a == UNTOUCHED && b == UNTOUCHED && c == UNTOUCHED && d == UNTOUCHED,
+          "a null handle leaves the outputs alone");
+}
+
+typedef int(VANTREL_CALL* ConversionFn)(void*, const char*, int, const int*, int, int*, int, int*);
+
+/* One conversion call: its result and every record's Lab and XYZ. */
+static void Convert(FILE* out, void* handle, const char* name, ConversionFn convert, const char* label,
+                    const char* dir, const char* file, int channels, int count, const int* input) {
+    int lab[3 * MAX_RECORDS], xyz[3 * MAX_RECORDS];
+    for (int i = 0; i < 3 * MAX_RECORDS; ++i) lab[i] = xyz[i] = UNTOUCHED;
+    char* path = dir ? Join(dir, file) : NULL;
+    int rc = convert(handle, dir ? path : file, count, input, 0, lab, 0, xyz);
+    free(path);
+    fprintf(out, "%s(%s, count %d) = %d\n", name, label, count, rc);
+    ProgressLine(out);
+    /* One record past the count shows whether the library wrote beyond it. */
+    int shown = count < 0 ? 1 : (count < MAX_RECORDS ? count + 1 : MAX_RECORDS);
+    for (int r = 0; r < shown; ++r) {
+        fprintf(out, "  in");
+        for (int c = 0; c < channels && r < count; ++c) fprintf(out, " %d", input[r * channels + c]);
+        fprintf(out, " -> lab %d %d %d xyz %d %d %d\n", lab[3 * r], lab[3 * r + 1], lab[3 * r + 2], xyz[3 * r],
+                xyz[3 * r + 1], xyz[3 * r + 2]);
+    }
+}
+
+static void Conversions(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
+    void* handle = NULL;
+    int rc = api->dllInit(OnProgress, &handle, NULL);
+    fprintf(out, "dllInit(null dir, for the conversions) = %d\n", rc);
+    ProgressLine(out);
+    Check(rc == 0 && handle != NULL, "dllInit without a directory gives a handle");
+    if (!handle) return;
+
+    static const int kCmyk[] = {0,   0,  0,   0,   100, 0,  0,   0,  0,  100, 0,  0,   0,  0,   100, 0,
+                                0,   0,  0,   100, 100, 100, 100, 100, 50, 50,  50, 50,  25, 75,  10,  0,
+                                100, 100, 0,  0,   0,   100, 100, 0,   100, 0,  100, 0,   30, 60,  90,  20};
+    static const int kRgb[] = {0,   0,   0,   255, 255, 255, 255, 0, 0,   0,   255, 0,   0,   0,  255,
+                               128, 128, 128, 255, 255, 0,   0,   255, 255, 255, 0,  255, 200, 100, 50};
+    const int cmykCount = (int)(sizeof kCmyk / sizeof kCmyk[0] / 4);
+    const int rgbCount = (int)(sizeof kRgb / sizeof kRgb[0] / 3);
+
+    /* A missing profile name is refused before anything happens. */
+    Convert(out, handle, "Cmyk2Lab_Double", api->Cmyk2Lab_Double, "empty name", NULL, "", 4, 1, kCmyk);
+    Convert(out, handle, "RGB2Lab_Double", api->RGB2Lab_Double, "null name", NULL, NULL, 3, 1, kRgb);
+    Convert(out, handle, "Cmykrgb2Lab_Double", api->Cmykrgb2Lab_Double, "empty name", NULL, "", 7, 1, kCmyk);
+
+    static const char* const kCmykProfiles[] = {"FOGRA39L.icc", "TR003.icc"};
+    for (size_t i = 0; i < sizeof kCmykProfiles / sizeof kCmykProfiles[0]; ++i) {
+        if (!Exists(paths->fixtures, kCmykProfiles[i])) {
+            fprintf(out, "profile %s missing\n", kCmykProfiles[i]);
+            continue;
+        }
+        Convert(out, handle, "Cmyk2Lab_Double", api->Cmyk2Lab_Double, kCmykProfiles[i], paths->fixtures,
+                kCmykProfiles[i], 4, cmykCount, kCmyk);
+        Convert(out, handle, "Cmyk2Lab_Double", api->Cmyk2Lab_Double, kCmykProfiles[i], paths->fixtures,
+                kCmykProfiles[i], 4, 0, kCmyk);
+    }
+    if (Exists(paths->colour, "sRGB.icc"))
+        Convert(out, handle, "RGB2Lab_Double", api->RGB2Lab_Double, "sRGB.icc", paths->colour, "sRGB.icc", 3,
+                rgbCount, kRgb);
+    else
+        fprintf(out, "profile sRGB.icc missing\n");
+
+    fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+}
+
+int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
+    g_failures = 0;
+    DigestReset(&g_progress);
+    IdentityFiles(api, paths, out);
+    NullHandles(api, out);
+    Conversions(api, paths, out);
+    fflush(out);
+    return g_failures;
+}
