@@ -1,7 +1,8 @@
 #include "it8/number_locale.h"
 
-#include <stdexcept>
 #include <string>
+
+#include "support/platform.h"
 
 namespace vantrel {
 namespace {
@@ -28,14 +29,6 @@ std::locale MeasurementNumberLocale(char decimalPoint) {
     return std::locale(std::locale::classic(), new DecimalOnly(decimalPoint));
 }
 
-std::locale MeasurementNumberLocale() {
-    char point = '.';
-    try {
-        point = std::use_facet<std::numpunct<char>>(std::locale("")).decimal_point();
-    } catch (const std::runtime_error&) {
-        // LANG or LC_ALL names a locale that is not installed: write with the classic point.
-    }
-    return MeasurementNumberLocale(point);
-}
+std::locale MeasurementNumberLocale() { return MeasurementNumberLocale(platform::UserDecimalPoint()); }
 
 }  // namespace vantrel

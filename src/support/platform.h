@@ -3,14 +3,18 @@
 #include <cstdint>
 #include <vector>
 
-// What the library takes from the operating system: its fixed file paths and the
-// identity profiles embedded in the library's own file.
+// What the library takes from the operating system: its fixed file paths, the user's
+// number format and the identity profiles embedded in the library's own file.
 namespace vantrel::platform {
 
 // The parameter file read when a tool object is created.
 const char* ParameterFilePath();
 // The ISD profile that the reference analysis writes and reads.
 const char* IsdProfilePath();
+
+// The decimal separator of the user's default locale, as the system's settings give it;
+// '.' when they cannot be read.
+char UserDecimalPoint();
 
 // Resource ids of the embedded identity profiles.
 constexpr int kNeutral3ccId = 102;

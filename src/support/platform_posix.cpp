@@ -2,12 +2,24 @@
 
 #include "support/platform.h"
 
+#include <locale>
+#include <stdexcept>
+
 #include "resources/identity_profiles.h"
 
 namespace vantrel::platform {
 
 const char* ParameterFilePath() { return "/tmp/vantrelparams.txt"; }
 const char* IsdProfilePath() { return "/tmp/vantrel.isd"; }
+
+char UserDecimalPoint() {
+    try {
+        return std::use_facet<std::numpunct<char>>(std::locale("")).decimal_point();
+    } catch (const std::runtime_error&) {
+        // LANG or LC_ALL names a locale that is not installed.
+        return '.';
+    }
+}
 
 // A shared object carries no resource section: the profiles are generated from
 // the same code that produces the Windows resources at build time.

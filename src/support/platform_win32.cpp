@@ -12,6 +12,16 @@ namespace vantrel::platform {
 const char* ParameterFilePath() { return "c:/temp/vantrelparams.txt"; }
 const char* IsdProfilePath() { return "c:/temp/vantrel.isd"; }
 
+// The C++ runtime's std::locale("") knows only "C" here; the user's number format is in the
+// regional settings.
+char UserDecimalPoint() {
+    wchar_t separator[8] = {};
+    if (GetLocaleInfoW(LOCALE_USER_DEFAULT, LOCALE_SDECIMAL, separator, 8) < 2) return '.';
+    // Separators longer than one character or outside ASCII have no place in a CGATS file.
+    if (separator[1] != L'\0' || separator[0] > 0x7F) return '.';
+    return static_cast<char>(separator[0]);
+}
+
 namespace {
 
 // The identity profiles live in the library's own file as resources of this type.
