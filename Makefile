@@ -48,7 +48,7 @@ test: build build-asan windows-if-possible
 
 demo: build
 	tools/make_fixtures.sh $(FIXTURES)
-	$(BUILD)/vantrel_demo $(FIXTURES)
+	$(BUILD)/vantrel_demo $(FIXTURES)/FOGRA39L.icc /usr/share/color/icc/FOGRA39L.ti3
 
 bench: build
 	tools/make_fixtures.sh $(FIXTURES)

@@ -6,16 +6,22 @@
 #include <memory>
 #include <new>
 
+#include "analysis/analyse1_search.h"
+#include "interface/device_conversion.h"
+#include "interface/host_number.h"
 #include "interface/parameter_file.h"
 #include "interface/tool_object.h"
 #include "support/platform.h"
 
 using vantrel::CIterativtoolDlg;
+using vantrel::DeviceRecord;
 
 namespace {
 
 // Result of an export whose worker the library does not have yet.
 constexpr int kNotAvailable = -1;
+// Result of an export given a null pointer it needs.
+constexpr int kBadArgument = -1;
 constexpr int kNullHandle = 1;
 
 CIterativtoolDlg* Tool(void* handle) { return static_cast<CIterativtoolDlg*>(handle); }
@@ -51,9 +57,22 @@ VANTREL_API int VANTREL_CALL dllFree(void* handle) {
     return 0;
 }
 
-VANTREL_API int VANTREL_CALL analyse1(void* handle, const char*, int*, int*) {
+VANTREL_API int VANTREL_CALL analyse1(void* handle, const char* paperProfile, int* lab, int* values) {
     if (!handle) return kNullHandle;
-    return kNotAvailable;
+    if (!paperProfile || !lab || !values) return kBadArgument;
+    CIterativtoolDlg& tool = *Tool(handle);
+    const double target[3] = {lab[0] / 1000.0, lab[1] / 1000.0, lab[2] / 1000.0};
+    double start[7];
+    for (int c = 0; c < 7; ++c) start[c] = values[c] / 1000.0;
+    tool.m_PaperName = paperProfile;
+    tool.m_Paperprof->Release();
+    tool.LoadPaperProfile(false);
+    double found[7];
+    double deltaE = 1000;
+    vantrel::Analyse1Search(*tool.m_Paperprof, target, start, deltaE, true, found);
+    for (int c = 0; c < 7; ++c) values[c] = vantrel::ToHostIntTruncated(found[c]);
+    tool.m_Paperprof->Release();
+    return 0;
 }
 
 VANTREL_API int VANTREL_CALL analyse2(void* handle, const char*, const char*, const char*, int*, int*) {
@@ -98,22 +117,22 @@ VANTREL_API int VANTREL_CALL mergeMCHintoCMYK(void* handle, const char*, const c
     return kNotAvailable;
 }
 
-VANTREL_API int VANTREL_CALL Cmyk2Lab_Double(void* handle, const char* profile, int, const int*, int, int*, int,
-                                             int*) {
-    if (!handle || !profile || !*profile) return -1;
-    return kNotAvailable;
+VANTREL_API int VANTREL_CALL Cmyk2Lab_Double(void* handle, const char* profile, int count, const int* cmyk, int,
+                                             int* lab, int, int* xyz) {
+    if (!handle) return -1;
+    return vantrel::ConvertDeviceRecords(*Tool(handle), profile, count, cmyk, lab, xyz, DeviceRecord::Cmyk);
 }
 
-VANTREL_API int VANTREL_CALL RGB2Lab_Double(void* handle, const char* profile, int, const int*, int, int*, int,
-                                            int*) {
-    if (!handle || !profile || !*profile) return -1;
-    return kNotAvailable;
+VANTREL_API int VANTREL_CALL RGB2Lab_Double(void* handle, const char* profile, int count, const int* rgb, int,
+                                             int* lab, int, int* xyz) {
+    if (!handle) return -1;
+    return vantrel::ConvertDeviceRecords(*Tool(handle), profile, count, rgb, lab, xyz, DeviceRecord::Rgb);
 }
 
-VANTREL_API int VANTREL_CALL Cmykrgb2Lab_Double(void* handle, const char* profile, int, const int*, int, int*,
-                                                int, int*) {
-    if (!handle || !profile || !*profile) return -1;
-    return kNotAvailable;
+VANTREL_API int VANTREL_CALL Cmykrgb2Lab_Double(void* handle, const char* profile, int count, const int* values, int,
+                                             int* lab, int, int* xyz) {
+    if (!handle) return -1;
+    return vantrel::ConvertDeviceRecords(*Tool(handle), profile, count, values, lab, xyz, DeviceRecord::Cmykrgb);
 }
 
 }  // extern "C"

@@ -6,16 +6,13 @@
 #include <string>
 #include <vector>
 
+#include "colour/colour_values.h"
 #include "eval/gamut_record.h"
 #include "icc/profil.h"
 #include "it8/measured_it8.h"
 #include "vantrel.h"
 
 namespace vantrel {
-
-struct Lab3 {
-    double L = 0, a = 0, b = 0;
-};
 
 // Default labels of the file names: a name holding one means nothing is selected.
 inline constexpr const char* kNo3ccSelected = "-no 3CC selected-";
@@ -54,6 +51,20 @@ public:
     // A patch's colour, from its Lab or converted from its XYZ.
     Lab PatchLab(const Measured_IT8& it8, int patch, bool fromXyz) const;
 
+    // Slot loaders: each loads its slot from the name the tool object holds for it, unless the
+    // name is empty or still holds its default label. They report progress and check nothing
+    // else: a missing file or tag leaves the slot empty. The caller releases beforehand.
+    void LoadOutprof();
+    void LoadISDProfile();
+    void LoadRefProfile();
+    // Also sets m_PaperWhite and, with computeGamut, rebuilds m_Gamut.
+    void LoadPaperProfile(bool computeGamut);
+    void LoadPaperProfilePerceptual();
+
+    // Lab (L* 0..100) to XYZ x 100 against the white of the first loaded profile among the
+    // reference, paper, 3CC and ISD profiles, else against D50.
+    XYZ LabToXYZ(double L, double a, double b) const;
+
     // Profile slots.
     std::unique_ptr<CProfil> m_Outprof;
     std::unique_ptr<CProfil> m_Refprof;
@@ -70,9 +81,9 @@ public:
     std::unique_ptr<Measured_IT8> m_MeasIT8;
     std::unique_ptr<Measured_IT8> m_PrevMeasIT8;
 
-    Lab3 m_RefWhite;
-    Lab3 m_MeasWhite;
-    Lab3 m_PaperWhite;
+    Lab m_RefWhite;
+    Lab m_MeasWhite;
+    Lab m_PaperWhite;
 
     GamutRecord m_Gamut;
 
