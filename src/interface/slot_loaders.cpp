@@ -5,14 +5,31 @@
 namespace vantrel {
 namespace {
 
-// The steps every loader shares: both directions' directories and tables, with the media
-// white in use on both sides.
 struct LoadPlan {
-    const char* tag0;
-    const char* tag1;
+    const char* tag0;  // direction 0, device to PCS
+    const char* tag1;  // direction 1, PCS to device
 };
 
 bool Skips(const std::string& name, const char* defaultLabel) { return name.empty() || name == defaultLabel; }
+
+// What every loader does: both directions' directories and tables, with the media white in
+// use on both sides. `between(k)` runs after the direction-0 table (k = 0) and after the
+// direction-1 directory (k = 1), where the paper loaders report progress.
+template <typename Between>
+void LoadDirections(CProfil& profile, const std::string& name, const LoadPlan& plan, Between between) {
+    profile.ReadTagTable(0, name);
+    profile.m_UseMediaWhite[0] = 1;
+    profile.LoadLut(0, plan.tag0, name);
+    between(0);
+    profile.ReadTagTable(1, name);
+    between(1);
+    profile.m_UseMediaWhite[1] = 1;
+    profile.LoadLut(1, plan.tag1, name);
+}
+
+void LoadDirections(CProfil& profile, const std::string& name, const LoadPlan& plan) {
+    LoadDirections(profile, name, plan, [](int) {});
+}
 
 }  // namespace
 
@@ -21,37 +38,21 @@ void CIterativtoolDlg::LoadOutprof() {
     // An abstract 3CC profile or a device link carries only its forward table; it serves both ways.
     const LoadPlan plan = m_AbstractOutprof == 1 ? LoadPlan{"A2B0", "A2B0"} : LoadPlan{"A2B1", "B2A1"};
     Progress("m_Outprof", 0, 4);
-    m_Outprof->ReadTagTable(0, m_OutprofName);
-    m_Outprof->m_UseMediaWhite[0] = 1;
-    m_Outprof->LoadLut(0, plan.tag0, m_OutprofName);
-    m_Outprof->ReadTagTable(1, m_OutprofName);
-    m_Outprof->m_UseMediaWhite[1] = 1;
-    m_Outprof->LoadLut(1, plan.tag1, m_OutprofName);
+    LoadDirections(*m_Outprof, m_OutprofName, plan);
     Progress("Finished ...", 1, 1);
 }
 
 void CIterativtoolDlg::LoadISDProfile() {
     if (!m_ISDprof || Skips(m_ISDName, kNoIsdSelected)) return;
-    const LoadPlan plan = m_UseIntent0 ? LoadPlan{"A2B0", "B2A0"} : LoadPlan{"A2B1", "B2A1"};
     Progress("load ISD", 0, 4);
-    m_ISDprof->ReadTagTable(0, m_ISDName);
-    m_ISDprof->m_UseMediaWhite[0] = 1;
-    m_ISDprof->LoadLut(0, plan.tag0, m_ISDName);
-    m_ISDprof->ReadTagTable(1, m_ISDName);
-    m_ISDprof->m_UseMediaWhite[1] = 1;
-    m_ISDprof->LoadLut(1, plan.tag1, m_ISDName);
+    LoadDirections(*m_ISDprof, m_ISDName, m_UseIntent0 ? LoadPlan{"A2B0", "B2A0"} : LoadPlan{"A2B1", "B2A1"});
     Progress("Finished ...", 1, 1);
 }
 
 void CIterativtoolDlg::LoadRefProfile() {
     if (!m_Refprof || Skips(m_RefName, kNoProfileSelected)) return;
     Progress("load Ref", 0, 4);
-    m_Refprof->ReadTagTable(0, m_RefName);
-    m_Refprof->m_UseMediaWhite[0] = 1;
-    m_Refprof->LoadLut(0, "A2B1", m_RefName);
-    m_Refprof->ReadTagTable(1, m_RefName);
-    m_Refprof->m_UseMediaWhite[1] = 1;
-    m_Refprof->LoadLut(1, "B2A1", m_RefName);
+    LoadDirections(*m_Refprof, m_RefName, {"A2B1", "B2A1"});
     Progress("Finished ...", 1, 1);
 }
 
@@ -60,19 +61,11 @@ void CIterativtoolDlg::LoadPaperProfile(bool computeGamut) {
     const LoadPlan plan = m_AbstractOutprof == 1 ? LoadPlan{"A2B0", "A2B0"}
                           : m_UseIntent0         ? LoadPlan{"A2B0", "B2A0"}
                                                  : LoadPlan{"A2B1", "B2A1"};
-    CProfil& paper = *m_Paperprof;
     Progress("load paper profile", 0, 4);
-    paper.ReadTagTable(0, m_PaperName);
-    paper.m_UseMediaWhite[0] = 1;
-    paper.LoadLut(0, plan.tag0, m_PaperName);
-    Progress("load paper profile", 1, 4);
-    paper.ReadTagTable(1, m_PaperName);
-    Progress("load paper profile", 2, 4);
-    paper.m_UseMediaWhite[1] = 1;
-    paper.LoadLut(1, plan.tag1, m_PaperName);
-    m_PaperWhite = paper.WhiteLab(0);
+    LoadDirections(*m_Paperprof, m_PaperName, plan, [this](int k) { Progress("load paper profile", k + 1, 4); });
+    m_PaperWhite = m_Paperprof->WhiteLab(0);
     if (computeGamut) {
-        m_Gamut = BuildGamutRecord(paper);
+        m_Gamut = BuildGamutRecord(*m_Paperprof);
         Progress("load paper profile", 3, 4);
     }
     // A record from an earlier call stays in use when the gamut is not rebuilt.
@@ -82,16 +75,10 @@ void CIterativtoolDlg::LoadPaperProfile(bool computeGamut) {
 
 void CIterativtoolDlg::LoadPaperProfilePerceptual() {
     if (!m_PaperprofPerceptual || Skips(m_PaperName, kNoProfileSelected)) return;
-    CProfil& copy = *m_PaperprofPerceptual;
+    const LoadPlan plan = {"A2B0", m_AbstractOutprof == 1 ? "A2B0" : "B2A0"};
     Progress("load copies of paper profile", 0, 5);
-    copy.ReadTagTable(0, m_PaperName);
-    copy.m_UseMediaWhite[0] = 1;
-    copy.LoadLut(0, "A2B0", m_PaperName);
-    Progress("load copies of paper profile", 3, 5);
-    copy.ReadTagTable(1, m_PaperName);
-    Progress("load copies of paper profile", 4, 5);
-    copy.m_UseMediaWhite[1] = 1;
-    copy.LoadLut(1, m_AbstractOutprof == 1 ? "A2B0" : "B2A0", m_PaperName);
+    LoadDirections(*m_PaperprofPerceptual, m_PaperName, plan,
+                   [this](int k) { Progress("load copies of paper profile", k + 3, 5); });
     Progress("Finished ...", 5, 5);
 }
 
