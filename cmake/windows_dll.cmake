@@ -7,7 +7,7 @@ enable_language(RC)
 # The profile writer runs on the build machine, so it is built with the native compiler.
 include(ExternalProject)
 set(VANTREL_HOST_TOOLS_DIR ${CMAKE_BINARY_DIR}/host-tools)
-set(VANTREL_PROFILE_WRITER ${VANTREL_HOST_TOOLS_DIR}/vantrel_profile_writer)
+set(VANTREL_PROFILE_WRITER ${VANTREL_HOST_TOOLS_DIR}/vantrel_profile_writer${CMAKE_HOST_EXECUTABLE_SUFFIX})
 ExternalProject_Add(vantrel_host_tools
   SOURCE_DIR ${CMAKE_SOURCE_DIR}/tools/host
   BINARY_DIR ${VANTREL_HOST_TOOLS_DIR}
