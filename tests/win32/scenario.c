@@ -221,12 +221,45 @@ static void Conversions(const VantrelApi* api, const ScenarioPaths* paths, FILE*
     fprintf(out, "dllFree = %d\n", api->dllFree(handle));
 }
 
+/* The device values that reproduce a wanted colour, from a start point. Reads the profile only. */
+static void DeviceSearches(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
+    if (!Exists(paths->fixtures, "FOGRA39L.icc")) {
+        fprintf(out, "profile FOGRA39L.icc missing\n");
+        return;
+    }
+    void* handle = NULL;
+    int rc = api->dllInit(OnProgress, &handle, NULL);
+    fprintf(out, "dllInit(null dir, for analyse1) = %d\n", rc);
+    ProgressLine(out);
+    if (!handle) return;
+    char* profile = Join(paths->fixtures, "FOGRA39L.icc");
+    /* Lab x 1000, then seven device values x 1000 on the 0..255 scale. */
+    static const int kCases[][10] = {
+        {50000, 0, 0, 127500, 127500, 127500, 0, 0, 0, 0},
+        {60000, 40000, 20000, 0, 127500, 127500, 0, 0, 0, 0},
+        {30000, -20000, -30000, 200000, 100000, 50000, 100000, 0, 0, 0},
+    };
+    for (size_t i = 0; profile && i < sizeof kCases / sizeof kCases[0]; ++i) {
+        int lab[3], values[7];
+        memcpy(lab, kCases[i], sizeof lab);
+        memcpy(values, kCases[i] + 3, sizeof values);
+        rc = api->analyse1(handle, profile, lab, values);
+        fprintf(out, "analyse1(FOGRA39L.icc, lab %d %d %d) = %d values %d %d %d %d %d %d %d lab %d %d %d\n",
+                kCases[i][0], kCases[i][1], kCases[i][2], rc, values[0], values[1], values[2], values[3], values[4],
+                values[5], values[6], lab[0], lab[1], lab[2]);
+        ProgressLine(out);
+    }
+    free(profile);
+    fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+}
+
 int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     g_failures = 0;
     DigestReset(&g_progress);
     IdentityFiles(api, paths, out);
     NullHandles(api, out);
     Conversions(api, paths, out);
+    DeviceSearches(api, paths, out);
     fflush(out);
     return g_failures;
 }
