@@ -19,7 +19,7 @@ inline double GridCoordinate(const LutView& t, int i, double x, bool snapInput) 
     if (x > 255.0) x = 255.0;
     const int first = i * t.inputEntries;
     const int last = first + t.inputEntries - 1;
-    const double p = first + (t.inputEntries - 1) * x / 255.0;
+    const double p = first + (t.inputEntries - 1) * x * (1.0 / 255.0);
     int k = static_cast<int>(p);
     double u = p - k;
     if (snapInput && u > kInputSnap) {
@@ -59,13 +59,17 @@ inline void SplitGridCoordinate(const LutView& t, double g, int32_t& index, doub
 }
 
 // Locates the cell of the inputs in scratch.vector: per channel the lower grid index, the
-// fraction and its complement. Returns the CLUT offset of the cell's first node.
-inline int32_t LocateKernelCell(const LutView& t, KernelScratch& s) {
+// fraction (also into f) and its complement. Returns the CLUT offset of the cell's first node.
+// kInputs > 0 fixes the input count at compile time.
+template <int kInputs = 0>
+inline int32_t LocateKernelCell(const LutView& t, KernelScratch& s, double* f) {
+    const int n = kInputs > 0 ? kInputs : t.inputs;
     int32_t base = 0;
-    for (int i = 0; i < t.inputs; ++i) {
+    for (int i = 0; i < n; ++i) {
         const double g = GridCoordinate(t, i, s.vector[i], true);
         WorkRecord& r = s.records[i];
         SplitGridCoordinate(t, g, r.index, r.fraction);
+        f[i] = r.fraction;
         s.complement[i] = 1.0 - r.fraction;
         base += r.index * t.clutStrides[i];
     }

@@ -8,20 +8,22 @@ namespace vantrel {
 
 // What the interpolation kernels read of one loaded lookup-table slot: counts, scales and
 // the unpacked 16-bit curves and grid. A view owns nothing; it points into the profile.
+// Its fields are set together by whoever makes the view (SlotView, or a test); a view of no
+// inputs is left alone by every kernel.
 struct LutView {
-    int inputs = 0;         // n
-    int outputs = 0;        // m
-    int inputEntries = 0;   // E, entries per input curve (256 or more)
-    int outputEntries = 0;  // O, entries per output curve
-    int grid = 0;           // G, grid points per dimension
-    double gridScale = 0;    // input-curve value to grid coordinate
-    double outputScale = 0;  // grid value to output-curve position
-    bool outputIdentity = false;
-    const uint16_t* inputCurves = nullptr;   // n x E, channel-major
-    const uint16_t* clut = nullptr;          // G^n x m, first input slowest
-    const uint16_t* outputCurves = nullptr;  // m x O, channel-major
-    const int32_t* clutStrides = nullptr;    // per input channel: G^(n-1-i) x m
-    const int32_t* cornerOffsets = nullptr;  // 2^n cell corners, by raised-channel count then channel
+    int inputs;         // n
+    int outputs;        // m
+    int inputEntries;   // E, entries per input curve (256 or more)
+    int outputEntries;  // O, entries per output curve
+    int grid;           // G, grid points per dimension
+    double gridScale;    // input-curve value to grid coordinate
+    double outputScale;  // grid value to output-curve position
+    bool outputIdentity;
+    const uint16_t* inputCurves;   // n x E, channel-major
+    const uint16_t* clut;          // G^n x m, first input slowest
+    const uint16_t* outputCurves;  // m x O, channel-major
+    const int32_t* clutStrides;    // per input channel: G^(n-1-i) x m
+    const int32_t* cornerOffsets;  // 2^n cell corners, by raised-channel count then channel
 
     // The output curves act only when they are long enough to be real curves and are not the identity.
     bool UsesOutputCurves() const { return outputEntries >= 256 && !outputIdentity; }

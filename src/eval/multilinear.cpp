@@ -26,7 +26,8 @@ double ThroughOutputCurve(const LutView& t, int j, double sum) {
 void InterpolateMultilinear(const LutView& t, KernelScratch& s) {
     const int n = t.inputs;
     if (n < 1 || n > CornerOrder::kMaxInputs || t.outputs < 1 || t.outputs > KernelScratch::kVectorSize) return;
-    const int32_t base = LocateKernelCell(t, s);
+    double f[CornerOrder::kMaxInputs];
+    const int32_t base = LocateKernelCell(t, s, f);
 
     // Corner weights: product of the fraction of each raised channel and the complement of
     // each other one. A corner past the last grid point always has weight 0.
@@ -34,7 +35,7 @@ void InterpolateMultilinear(const LutView& t, KernelScratch& s) {
     for (int k = 0; k < corners; ++k) {
         const unsigned mask = CornerOrder::Mask(n, k);
         double w = 1.0;
-        for (int i = 0; i < n; ++i) w *= ((mask >> i) & 1u) ? s.records[i].fraction : s.complement[i];
+        for (int i = 0; i < n; ++i) w *= ((mask >> i) & 1u) ? f[i] : s.complement[i];
         s.weights[k] = w;
     }
 

@@ -1,9 +1,11 @@
 // Sorted-fraction (Kuhn) interpolation of tables of one to four inputs.
 //
-// A cell of n inputs is cut into n! simplices; the point lies in the one found by raising
-// the channels in the order of their fractions, largest first. Corners whose weight is 0
-// are never read: a channel with fraction 0 is never raised, and the corner between two
-// equal fractions is skipped, so a point on the last grid point reads no node past it.
+// A cell of n inputs is cut into n! simplices; the point lies in the one found by raising the
+// channels in the order of their fractions, largest first, and its value is the weighted sum of
+// the n + 1 corners of that walk. A channel whose fraction is 0 is never raised, so a point on
+// the last grid point (index G - 1, fraction 0) reads no node past it; the corner between two
+// equal fractions has weight 0. Points on a node and points on the cell's diagonal take their one
+// or two corners directly.
 #include "eval/interpolation.h"
 
 #include "eval/grid_coordinate.h"
@@ -11,31 +13,27 @@
 namespace vantrel {
 namespace {
 
-// At most five corners of a four-input simplex.
-struct SimplexWalk {
-    int32_t node[5];
-    double weight[5];
-    int count = 0;
+constexpr int kMaxCorners = 5;
 
-    void Add(int32_t n, double w) {
-        if (w > 0.0) {
-            node[count] = n;
-            weight[count] = w;
-            ++count;
-        }
-    }
+struct SimplexWalk {
+    int32_t node[kMaxCorners];
+    double weight[kMaxCorners];
+    int count = 0;
 };
 
-template <bool kCurves>
+// Output j = sum of weight x corner value. kOutputs and kCorners > 0 fix the counts at compile
+// time so that the sums unroll.
+template <bool kCurves, int kOutputs, int kCorners>
 void Accumulate(const LutView& t, const SimplexWalk& walk, double* out) {
-    const int m = t.outputs;
+    const int m = kOutputs > 0 ? kOutputs : t.outputs;
+    const int corners = kCorners > 0 ? kCorners : walk.count;
     const int entries = t.outputEntries;
     const double scale = t.outputScale;
     const uint16_t* clut = t.clut;
     for (int j = 0; j < m; ++j) {
         const uint16_t* curve = t.outputCurves + j * entries;
         double sum = 0.0;
-        for (int k = 0; k < walk.count; ++k) {
+        for (int k = 0; k < corners; ++k) {
             const uint16_t c = clut[walk.node[k] + j];
             if constexpr (kCurves) {
                 // Each corner goes through the output curve on its own, without interpolation.
@@ -48,131 +46,104 @@ void Accumulate(const LutView& t, const SimplexWalk& walk, double* out) {
     }
 }
 
+template <int kCorners>
 void Finish(const LutView& t, const SimplexWalk& walk, double* out) {
-    if (t.UsesOutputCurves()) {
-        Accumulate<true>(t, walk, out);
+    const bool curves = t.UsesOutputCurves();
+    if (t.outputs == 3) {  // device-to-Lab tables
+        curves ? Accumulate<true, 3, kCorners>(t, walk, out) : Accumulate<false, 3, kCorners>(t, walk, out);
+    } else if (t.outputs == 4) {  // Lab-to-CMYK tables
+        curves ? Accumulate<true, 4, kCorners>(t, walk, out) : Accumulate<false, 4, kCorners>(t, walk, out);
     } else {
-        Accumulate<false>(t, walk, out);
+        curves ? Accumulate<true, 0, kCorners>(t, walk, out) : Accumulate<false, 0, kCorners>(t, walk, out);
     }
 }
 
-// Walks from the first corner raising channels a, b, c, d (fractions fa >= fb >= fc >= fd).
-void Walk4(const LutView& t, int32_t base, const double* f, int a, int b, int c, int d, SimplexWalk& walk) {
-    const int32_t* s = t.clutStrides;
-    walk.Add(base, 1.0 - f[a]);
-    const int32_t p1 = base + s[a];
-    walk.Add(p1, f[a] - f[b]);
-    const int32_t p2 = p1 + s[b];
-    walk.Add(p2, f[b] - f[c]);
-    const int32_t p3 = p2 + s[c];
-    walk.Add(p3, f[c] - f[d]);
-    walk.Add(p3 + s[d], f[d]);
+// A point on a node: that node alone.
+void OnNode(const LutView& t, int32_t base, double* out) {
+    SimplexWalk walk;
+    walk.node[0] = base;
+    walk.weight[0] = 1.0;
+    walk.count = 1;
+    Finish<1>(t, walk, out);
 }
 
-void Walk3(const LutView& t, int32_t base, const double* f, int a, int b, int c, SimplexWalk& walk) {
-    const int32_t* s = t.clutStrides;
-    walk.Add(base, 1.0 - f[a]);
-    const int32_t p1 = base + s[a];
-    walk.Add(p1, f[a] - f[b]);
-    const int32_t p2 = p1 + s[b];
-    walk.Add(p2, f[b] - f[c]);
-    walk.Add(p2 + s[c], f[c]);
+// All fractions equal to f > 0: the first corner and the corner with every channel raised.
+void OnDiagonal(const LutView& t, int32_t base, double f, double* out) {
+    SimplexWalk walk;
+    walk.node[0] = base;
+    walk.weight[0] = 1.0 - f;
+    walk.node[1] = base + t.cornerOffsets[(1 << t.inputs) - 1];
+    walk.weight[1] = f;
+    walk.count = 2;
+    Finish<2>(t, walk, out);
 }
 
-void Simplex1(const LutView& t, int32_t base, const double* f, SimplexWalk& walk) {
-    walk.Add(base, 1.0 - f[0]);
-    if (f[0] > 0.0) walk.Add(base + t.clutStrides[0], f[0]);
-}
-
-void Simplex2(const LutView& t, int32_t base, const double* f, SimplexWalk& walk) {
-    const int32_t* s = t.clutStrides;
-    const double f0 = f[0], f1 = f[1];
-    if (f0 == f1) {
-        walk.Add(base, 1.0 - f0);
-        if (f0 > 0.0) walk.Add(base + s[0] + s[1], f0);
-        return;
+// The walk through channels o[0..N-1] (fractions largest first): weights 1 - f(1),
+// f(1) - f(2), .., f(N).
+template <int N>
+void Walk(const LutView& t, int32_t base, const double* f, const int* o, double* out) {
+    SimplexWalk walk;
+    int32_t node = base;
+    double previous = 1.0;
+    walk.node[0] = base;
+    for (int k = 0; k < N; ++k) {
+        const int c = o[k];
+        walk.weight[k] = previous - f[c];
+        previous = f[c];
+        if (f[c] > 0.0) node += t.clutStrides[c];  // never past the last grid point
+        walk.node[k + 1] = node;
     }
-    const int a = f0 > f1 ? 0 : 1;
-    const int b = 1 - a;
-    walk.Add(base, 1.0 - f[a]);
-    const int32_t p1 = base + s[a];
-    walk.Add(p1, f[a] - f[b]);
-    walk.Add(p1 + s[b], f[b]);
+    walk.weight[N] = previous;
+    walk.count = N + 1;
+    Finish<N + 1>(t, walk, out);
 }
 
-void Simplex3(const LutView& t, int32_t base, const double* f, SimplexWalk& walk) {
+void Simplex1(const LutView& t, int32_t base, const double* f, double* out) {
+    if (f[0] == 0.0) return OnNode(t, base, out);
+    const int o[1] = {0};
+    Walk<1>(t, base, f, o, out);
+}
+
+void Simplex2(const LutView& t, int32_t base, const double* f, double* out) {
+    if (f[0] == f[1]) return f[0] == 0.0 ? OnNode(t, base, out) : OnDiagonal(t, base, f[0], out);
+    const int o[2] = {f[0] > f[1] ? 0 : 1, f[0] > f[1] ? 1 : 0};
+    Walk<2>(t, base, f, o, out);
+}
+
+void Simplex3(const LutView& t, int32_t base, const double* f, double* out) {
     const double f0 = f[0], f1 = f[1], f2 = f[2];
-    if (f0 == 0.0 && f1 == 0.0 && f2 == 0.0) {
-        walk.Add(base, 1.0);
-        return;
-    }
-    if (f0 == f1 && f1 == f2) {
-        walk.Add(base, 1.0 - f0);
-        walk.Add(base + t.cornerOffsets[7], f0);
-        return;
-    }
-    if (f0 >= f1) {
-        if (f1 >= f2) {
-            Walk3(t, base, f, 0, 1, 2, walk);
-        } else if (f0 >= f2) {
-            Walk3(t, base, f, 0, 2, 1, walk);
-        } else {
-            Walk3(t, base, f, 2, 0, 1, walk);
-        }
-    } else {
-        if (f0 >= f2) {
-            Walk3(t, base, f, 1, 0, 2, walk);
-        } else if (f1 >= f2) {
-            Walk3(t, base, f, 1, 2, 0, walk);
-        } else {
-            Walk3(t, base, f, 2, 1, 0, walk);
-        }
-    }
+    if (f0 == f1 && f1 == f2) return f0 == 0.0 ? OnNode(t, base, out) : OnDiagonal(t, base, f0, out);
+    // Each channel's place is the number of channels ahead of it (the lower channel first
+    // among equal fractions).
+    int o[3];
+    o[(f1 > f0) + (f2 > f0)] = 0;
+    o[(f0 >= f1) + (f2 > f1)] = 1;
+    o[(f0 >= f2) + (f1 >= f2)] = 2;
+    Walk<3>(t, base, f, o, out);
 }
 
-void Simplex4(const LutView& t, int32_t base, const double* f, SimplexWalk& walk) {
+void Simplex4(const LutView& t, int32_t base, const double* f, double* out) {
     const double f0 = f[0], f1 = f[1], f2 = f[2], f3 = f[3];
-    if (f0 == 0.0 && f1 == 0.0 && f2 == 0.0 && f3 == 0.0) {
-        walk.Add(base, 1.0);
-        return;
-    }
-    if (f0 == f1 && f1 == f2 && f2 == f3) {
-        walk.Add(base, 1.0 - f0);
-        walk.Add(base + t.cornerOffsets[15], f0);
-        return;
-    }
-    // Order the four channels by fraction, largest first, with a five-comparison network.
-    int o[4] = {0, 1, 2, 3};
-    auto order = [&](int x, int y) {
-        if (f[o[y]] > f[o[x]]) {
-            const int keep = o[x];
-            o[x] = o[y];
-            o[y] = keep;
-        }
-    };
-    order(0, 1);
-    order(2, 3);
-    order(0, 2);
-    order(1, 3);
-    order(1, 2);
-    Walk4(t, base, f, o[0], o[1], o[2], o[3], walk);
+    if (f0 == f1 && f1 == f2 && f2 == f3) return f0 == 0.0 ? OnNode(t, base, out) : OnDiagonal(t, base, f0, out);
+    int o[4];
+    o[(f1 > f0) + (f2 > f0) + (f3 > f0)] = 0;
+    o[(f0 >= f1) + (f2 > f1) + (f3 > f1)] = 1;
+    o[(f0 >= f2) + (f1 >= f2) + (f3 > f2)] = 2;
+    o[(f0 >= f3) + (f1 >= f3) + (f2 >= f3)] = 3;
+    Walk<4>(t, base, f, o, out);
 }
 
 }  // namespace
 
 void InterpolateSimplex(const LutView& t, KernelScratch& s) {
     if (t.inputs < 1 || t.inputs > 4 || t.outputs < 1 || t.outputs > KernelScratch::kVectorSize) return;
-    const int32_t base = LocateKernelCell(t, s);
     double f[4];
-    for (int i = 0; i < t.inputs; ++i) f[i] = s.records[i].fraction;
-    SimplexWalk walk;
     switch (t.inputs) {
-        case 1: Simplex1(t, base, f, walk); break;
-        case 2: Simplex2(t, base, f, walk); break;
-        case 3: Simplex3(t, base, f, walk); break;
-        default: Simplex4(t, base, f, walk); break;
+        case 1: Simplex1(t, LocateKernelCell<1>(t, s, f), f, s.vector); break;
+        case 2: Simplex2(t, LocateKernelCell<2>(t, s, f), f, s.vector); break;
+        case 3: Simplex3(t, LocateKernelCell<3>(t, s, f), f, s.vector); break;
+        default: Simplex4(t, LocateKernelCell<4>(t, s, f), f, s.vector); break;
     }
-    Finish(t, walk, s.vector);
 }
 
 }  // namespace vantrel

@@ -6,9 +6,16 @@
 
 namespace vantrel {
 
+namespace {
+
+// Built field by field: an evaluation makes one per call, and zeroing it first costs more than
+// filling it.
+LutView NoTable() { return LutView{}; }
+
+}  // namespace
+
 LutView SlotView(const CProfil& p, int slot) {
-    LutView v;
-    if (slot < 0 || slot > 1) return v;
+    if (slot < 0 || slot > 1) return NoTable();
     const LutSlot& lut = p.m_Lut[slot];
     const int n = lut.inputChannels;
     const int m = lut.outputChannels;
@@ -17,7 +24,7 @@ LutView SlotView(const CProfil& p, int slot) {
     const int grid = lut.gridPoints;
     if (n < 1 || n > CProfil::kMaxInputs || m < 1 || m > KernelScratch::kVectorSize || grid < 1 || entries < 1 ||
         outEntries < 1)
-        return v;
+        return NoTable();
     // The tables must be as large as the descriptor says, else nothing is read from them.
     const auto& in = p.m_InputCurves[slot];
     const auto& clut = p.m_Clut[slot];
@@ -25,7 +32,8 @@ LutView SlotView(const CProfil& p, int slot) {
     const uint64_t clutValues = static_cast<uint64_t>(p.m_ClutStride[slot][0]) * static_cast<uint64_t>(grid);
     if (in.size() < static_cast<uint64_t>(n) * entries || clut.empty() || clut.size() < clutValues ||
         out.size() < static_cast<uint64_t>(m) * outEntries)
-        return v;
+        return NoTable();
+    LutView v;
     v.inputs = n;
     v.outputs = m;
     v.inputEntries = entries;
