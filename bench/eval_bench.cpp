@@ -53,7 +53,8 @@ public:
         device_ = cmsOpenProfileFromFile(Fogra().c_str(), "r");
         lab_ = cmsCreateLab4Profile(nullptr);
         if (device_ && lab_)
-            transform_ = cmsCreateTransform(device_, TYPE_CMYK_DBL, lab_, TYPE_Lab_DBL, INTENT_ABSOLUTE_COLORIMETRIC, 0);
+            transform_ =
+                cmsCreateTransform(device_, TYPE_CMYK_DBL, lab_, TYPE_Lab_DBL, INTENT_ABSOLUTE_COLORIMETRIC, 0);
     }
     ~LcmsForward() {
         if (transform_) cmsDeleteTransform(transform_);

@@ -236,6 +236,7 @@ GamutRecord BuildGamutRecord(CProfil& p) {
 }
 
 bool IsInGamut(const GamutRecord& g, double L, double a, double b) {
+    if (!std::isfinite(L) || !std::isfinite(a) || !std::isfinite(b)) return false;
     const LCh c = LabToLCh(L, a, b);
     const double scaled = c.L * kLightnessScale;
     const int hue = static_cast<int>(c.h / kHueBin + 0.5);

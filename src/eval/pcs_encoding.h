@@ -15,8 +15,12 @@ constexpr double kLightnessScale = 2.55;
 
 inline double Clamp(double v, double lo, double hi) { return v < lo ? lo : (v > hi ? hi : v); }
 
-inline bool IsXyzPcs(const LutSlot& lut) { return lut.pcs.size() >= 3 && std::memcmp(lut.pcs.data(), "XYZ", 3) == 0; }
-inline bool IsMatrixTrc(const LutSlot& lut) { return lut.type.size() == 4 && std::memcmp(lut.type.data(), "MATR", 4) == 0; }
+inline bool IsXyzPcs(const LutSlot& lut) {
+    return lut.pcs.size() >= 3 && std::memcmp(lut.pcs.data(), "XYZ", 3) == 0;
+}
+inline bool IsMatrixTrc(const LutSlot& lut) {
+    return lut.type.size() == 4 && std::memcmp(lut.type.data(), "MATR", 4) == 0;
+}
 // True when the four-character data colour space matches; "RGB" also matches "RGB ".
 inline bool SpaceIs(const std::string& space, const char* four) {
     const size_t n = std::strlen(four);

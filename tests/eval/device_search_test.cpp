@@ -21,7 +21,9 @@ Lab Ramps(const std::vector<double>& f) { return Lab{60 - 24 * f[0], 40 * f[1], 
 
 class SearchOnRamps : public ::testing::Test {
 protected:
-    void SetUp() override { WriteAndLoad(p_, dir_, "ramps.icc", "CMYK", {{"A2B1", Mft2Tag(DeviceToLabLut(4, 2, Ramps))}}); }
+    void SetUp() override {
+        WriteAndLoad(p_, dir_, "ramps.icc", "CMYK", {{"A2B1", Mft2Tag(DeviceToLabLut(4, 2, Ramps))}});
+    }
     Lab Colour(const double* device) {
         double v[4] = {device[0], device[1], device[2], device[3]};
         CmykToLab(p_, v);

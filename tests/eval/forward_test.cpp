@@ -196,6 +196,33 @@ TEST(ForwardEvaluation, LabThroughTableInEitherSlot) {
     }
 }
 
+TEST(ForwardEvaluation, PaperOfAnXyzTableGivesTheMediaWhiteInAbsoluteColorimetry) {
+    // Node 0 (no ink) holds the D50 white of the relative table; the media white is darker and
+    // yellower.
+    const double d50[3] = {0.9642, 1.0, 0.8249};
+    TempDir dir;
+    IccBuilder builder("CMYK", "XYZ ");
+    builder.AddTag("A2B1", Mft2Tag(MakeLut(4, 3, 2, [&](const std::vector<int>& n, int out) {
+        const double scale = n[0] + n[1] + n[2] + n[3] == 0 ? 1.0 : 0.2;
+        return uint16_t(std::lround(d50[out] * scale * 32768.0));
+    })));
+    builder.AddTag("wtpt", XyzTag(0.86, 0.90, 0.66));
+    const std::string path = WriteFile(dir.File("xyz.icc"), builder.Build());
+    CProfil p;
+    p.m_UseMediaWhite[0] = 1;
+    p.ReadTagTable(0, path);
+    ASSERT_EQ(p.LoadLut(0, "A2B1", path), 1);
+    double v[4] = {0, 0, 0, 0};
+    CmykToLab(p, v);
+    cmsCIEXYZ media{p.m_MediaWhite[0][0], p.m_MediaWhite[0][1], p.m_MediaWhite[0][2]};
+    cmsCIEXYZ illuminant{p.m_Illuminant[0][0], p.m_Illuminant[0][1], p.m_Illuminant[0][2]};
+    cmsCIELab expected;
+    cmsXYZ2Lab(&illuminant, &expected, &media);
+    EXPECT_NEAR(v[0] / 2.55, expected.L, 0.05);
+    EXPECT_NEAR(v[1], expected.a, 0.05);
+    EXPECT_NEAR(v[2], expected.b, 0.05);
+}
+
 TEST(ForwardEvaluation, LightnessAbove255IsCappedAndLabOf16BitWhiteDecodes) {
     TempDir dir;
     CProfil p;

@@ -3,12 +3,11 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
-#include <fstream>
-#include <sstream>
 
 #include "colour/colour_math.h"
 #include "eval/gamut_record.h"
 #include "eval_oracle.h"
+#include "it8/measured_it8.h"
 #include "synthetic_profiles.h"
 
 namespace vantrel {
@@ -16,38 +15,13 @@ namespace {
 
 using namespace test;
 
-// The Lab column of a characterisation file (.ti3).
+// The measured colours of a characterisation file, read as the library reads measurements.
 std::vector<Lab> MeasuredLab(const std::string& path) {
-    std::ifstream in(path);
-    std::string line;
-    std::vector<std::string> fields;
+    Measured_IT8 it8;
     std::vector<Lab> rows;
-    bool data = false;
-    int L = -1, a = -1, b = -1;
-    while (std::getline(in, line)) {
-        std::istringstream words(line);
-        std::string first;
-        words >> first;
-        if (first == "BEGIN_DATA_FORMAT") {
-            std::getline(in, line);
-            std::istringstream names(line);
-            for (std::string name; names >> name;) fields.push_back(name);
-            for (size_t i = 0; i < fields.size(); ++i) {
-                if (fields[i] == "LAB_L") L = int(i);
-                if (fields[i] == "LAB_A") a = int(i);
-                if (fields[i] == "LAB_B") b = int(i);
-            }
-        } else if (first == "BEGIN_DATA") {
-            data = true;
-        } else if (first == "END_DATA") {
-            data = false;
-        } else if (data && L >= 0) {
-            std::vector<double> values;
-            std::istringstream all(line);
-            for (std::string v; all >> v;) values.push_back(std::atof(v.c_str()));
-            if (values.size() == fields.size()) rows.push_back(Lab{values[L], values[a], values[b]});
-        }
-    }
+    if (it8.ReadIt8(path) != 0) return rows;
+    for (int set = 0; set < it8.PatchCount(); ++set)
+        rows.push_back({it8.GetLab(set, 0), it8.GetLab(set, 1), it8.GetLab(set, 2)});
     return rows;
 }
 
@@ -156,8 +130,10 @@ TEST(GamutRecord, LookUpRoundsToTheCellAndComparesRoundedChroma) {
     g.lightnessMax = 240;
     g.chroma[0][16] = 0;
     EXPECT_FALSE(IsInGamut(g, 50, 0, 0));
-    // Lightness far beyond the table is outside, not a read past it.
+    // Lightness far beyond the table is outside, not a read past it; so is no number at all.
     EXPECT_FALSE(IsInGamut(g, 250, 0, 0));
+    EXPECT_FALSE(IsInGamut(g, std::nan(""), 0, 0));
+    EXPECT_FALSE(IsInGamut(g, 50, INFINITY, 0));
 }
 
 }  // namespace

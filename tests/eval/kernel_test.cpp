@@ -294,26 +294,6 @@ TEST(Kernels, EqualHalfFractionsGiveTheDiagonalForSimplexAndTheCornerMeanForMult
     }
 }
 
-TEST(Kernels, EightBitTablesMapEachCornerThroughItsCurveEntry) {
-    RandomLut t = LinearTable(4, 5, false);
-    Scratch s;
-    const auto got = Evaluate(Kernel::Simplex, t, {255, 0, 255, 0}, s);
-    for (int j = 0; j < 3; ++j) EXPECT_EQ(got[j], t.out[j * 256 + t.clut[t.Node({4, 0, 4, 0}) + j]]);
-}
-
-TEST(Kernels, TwoEntryOutputCurvesAreSkippedByBothKernels) {
-    RandomLut t = LinearTable(3, 5);
-    t.O = 2;
-    // A curve that would change values if it were applied: reversed.
-    t.out = {65535, 0, 65535, 0, 65535, 0};
-    Scratch s;
-    const std::vector<double> x = {255.0 / 4, 255.0 / 2, 255.0};
-    for (Kernel kernel : {Kernel::Simplex, Kernel::Multilinear}) {
-        const auto got = Evaluate(kernel, t, x, s);
-        for (int j = 0; j < 3; ++j) EXPECT_EQ(got[j], t.clut[t.Node({1, 2, 4}) + j]);
-    }
-}
-
 TEST(Kernels, UnsupportedInputCountsLeaveTheVectorAlone) {
     std::mt19937 rng(3);
     RandomLut t;

@@ -46,7 +46,8 @@ inline LutSpec DeviceLut(int inputs, int outputs, int grid,
     return MakeLut(
         inputs, outputs, grid,
         [&](const std::vector<int>& node, int out) {
-            return static_cast<uint16_t>(std::lround(std::clamp(device(NodeFractions(node, grid), out), 0.0, 255.0) * 257.0));
+            const double value = std::clamp(device(NodeFractions(node, grid), out), 0.0, 255.0);
+            return static_cast<uint16_t>(std::lround(value * 257.0));
         },
         256, 256);
 }
