@@ -7,6 +7,7 @@
 #include <new>
 
 #include "analysis/analyse1_search.h"
+#include "analysis/analyse2.h"
 #include "interface/device_conversion.h"
 #include "interface/host_number.h"
 #include "interface/parameter_file.h"
@@ -75,9 +76,10 @@ VANTREL_API int VANTREL_CALL analyse1(void* handle, const char* paperProfile, in
     return 0;
 }
 
-VANTREL_API int VANTREL_CALL analyse2(void* handle, const char*, const char*, const char*, int*, int*) {
+VANTREL_API int VANTREL_CALL analyse2(void* handle, const char* isdProfile, const char* outIT8, const char* measIT8,
+                                      int* out1, int* out2) {
     if (!handle) return kNullHandle;
-    return kNotAvailable;
+    return vantrel::Analyse2(*Tool(handle), isdProfile, outIT8, measIT8, out1, out2);
 }
 
 VANTREL_API int VANTREL_CALL analyse3(void* handle, const char*, const char*, const char*, const char*, int*,

@@ -50,6 +50,10 @@ public:
     Lab MeasuredXyzToLab(double X, double Y, double Z) const;
     // A patch's colour, from its Lab or converted from its XYZ.
     Lab PatchLab(const Measured_IT8& it8, int patch, bool fromXyz) const;
+    // The ISD analysis (analysis/analyse2.cpp): when m_ISDMode is set and an ISD profile is named,
+    // writes m_MeasIT8 through the ISD profile's Lab-to-Lab table to m_MeasIT8Name + "isd.it8",
+    // then makes that file the measurement (m_MeasIT8Name, m_MeasIT8, m_MeasWhite).
+    void IsdAnalysis();
 
     // Slot loaders: each loads its slot from the name the tool object holds for it, unless the
     // name is empty or still holds its default label. They report progress and check nothing
