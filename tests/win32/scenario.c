@@ -76,8 +76,9 @@ static char* Join(const char* dir, const char* name) {
     return path;
 }
 
-/* Size and digest of a file, or "missing". Returns the size, -1 when missing. */
-static long FileLine(FILE* out, const char* dir, const char* name) {
+/* Size and digest of a file, or "missing". Returns the size, -1 when missing. A text file
+ * is digested without its carriage returns: Windows writes its lines with CR LF. */
+static long DigestFileLine(FILE* out, const char* dir, const char* name, int text) {
     char* path = Join(dir, name);
     FILE* f = path ? fopen(path, "rb") : NULL;
     free(path);
@@ -91,6 +92,12 @@ static long FileLine(FILE* out, const char* dir, const char* name) {
     long size = 0;
     size_t got;
     while ((got = fread(buffer, 1, sizeof buffer, f)) > 0) {
+        if (text) {
+            size_t kept = 0;
+            for (size_t i = 0; i < got; ++i)
+                if (buffer[i] != '\r') buffer[kept++] = buffer[i];
+            got = kept;
+        }
         DigestBytes(&d, buffer, got);
         size += (long)got;
     }
@@ -100,6 +107,9 @@ static long FileLine(FILE* out, const char* dir, const char* name) {
     fputc('\n', out);
     return size;
 }
+
+static long FileLine(FILE* out, const char* dir, const char* name) { return DigestFileLine(out, dir, name, 0); }
+static long TextFileLine(FILE* out, const char* dir, const char* name) { return DigestFileLine(out, dir, name, 1); }
 
 static int Exists(const char* dir, const char* name) {
     char* path = Join(dir, name);
@@ -253,6 +263,50 @@ static void DeviceSearches(const VantrelApi* api, const ScenarioPaths* paths, FI
     fprintf(out, "dllFree = %d\n", api->dllFree(handle));
 }
 
+static int CopyFile(const char* from, const char* to) {
+    FILE* in = from ? fopen(from, "rb") : NULL;
+    FILE* out = in && to ? fopen(to, "wb") : NULL;
+    int ok = in && out;
+    unsigned char buffer[65536];
+    size_t got;
+    while (ok && (got = fread(buffer, 1, sizeof buffer, in)) > 0) ok = fwrite(buffer, 1, got, out) == got;
+    if (in) fclose(in);
+    if (out) fclose(out);
+    return ok;
+}
+
+/* A measurement through the embedded neutral profile: the file it writes next to the
+ * measurement and its copy must be the same in both builds. */
+static void IsdAnalysis(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
+    char* source = Join(paths->colour, "TR003.ti3");
+    char* meas = Join(paths->work, "meas.ti3");
+    int copied = CopyFile(source, meas);
+    free(source);
+    if (!copied) {
+        fprintf(out, "measurement TR003.ti3 missing\n");
+        free(meas);
+        return;
+    }
+    void* handle = NULL;
+    int rc = api->dllInit(OnProgress, &handle, paths->work);
+    fprintf(out, "dllInit(work dir, for analyse2) = %d\n", rc);
+    ProgressLine(out);
+    char* isd = Join(paths->work, "neutral.3cc");
+    char* result = Join(paths->work, "analyse2-out.it8");
+    if (handle && isd && result) {
+        int out1 = UNTOUCHED, out2 = UNTOUCHED;
+        rc = api->analyse2(handle, isd, result, meas, &out1, &out2);
+        fprintf(out, "analyse2(neutral.3cc, TR003.ti3) = %d out %d %d\n", rc, out1, out2);
+        ProgressLine(out);
+        TextFileLine(out, paths->work, "meas.ti3isd.it8");
+        TextFileLine(out, paths->work, "analyse2-out.it8");
+    }
+    free(isd);
+    free(result);
+    free(meas);
+    if (handle) fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+}
+
 int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     g_failures = 0;
     DigestReset(&g_progress);
@@ -260,6 +314,7 @@ int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     NullHandles(api, out);
     Conversions(api, paths, out);
     DeviceSearches(api, paths, out);
+    IsdAnalysis(api, paths, out);
     fflush(out);
     return g_failures;
 }
