@@ -1,5 +1,6 @@
 #include "colour/colour_math.h"
 
+#include <algorithm>
 #include <cmath>
 
 #include "colour/cube_root_table.h"
@@ -12,8 +13,6 @@ constexpr double kCone[3][3] = {{0.8951, 0.2664, -0.1614}, {-0.7502, 1.7135, 0.0
 constexpr double kConeInverse[3][3] = {{0.987, -0.1471, 0.16}, {0.4323, 0.5184, 0.0493}, {-0.0085, 0.04, 0.9685}};
 
 constexpr double kSixteenOver116 = 16.0 / 116.0;
-
-double Clamp(double value, double low, double high) { return value < low ? low : value > high ? high : value; }
 
 // The inverse companding: f^3 above 6/29, a straight line below.
 double InverseF(double f) {
@@ -71,9 +70,9 @@ double HueAngle(double a, double b) {
 }
 
 LCh LabToLCh(double L, double a, double b) {
-    L = Clamp(L, 0.0, 255.0);
-    a = Clamp(a, -128.0, 127.0);
-    b = Clamp(b, -128.0, 127.0);
+    L = std::clamp(L, 0.0, 255.0);
+    a = std::clamp(a, -128.0, 127.0);
+    b = std::clamp(b, -128.0, 127.0);
     const double C = std::sqrt(a * a + b * b);
     return {L, C, C == 0 ? 0.0 : HueAngle(a, b)};
 }
@@ -84,7 +83,7 @@ Lab LChToLab(double L, double C, double h) {
         a = C * std::cos(h * kHuePi / 180.0);
         b = C * std::sin(h * kHuePi / 180.0);
     }
-    return {Clamp(L, 0.0, 255.0), Clamp(a, -128.0, 127.0), Clamp(b, -128.0, 127.0)};
+    return {std::clamp(L, 0.0, 255.0), std::clamp(a, -128.0, 127.0), std::clamp(b, -128.0, 127.0)};
 }
 
 double DeltaE(double L1, double a1, double b1, double L2, double a2, double b2) {

@@ -1,15 +1,14 @@
 // The colour conversions that depend on a profile's white points.
+#include <algorithm>
+
 #include "colour/colour_math.h"
 #include "icc/profil.h"
 
 namespace vantrel {
 namespace {
 
-bool ValidDirection(int direction) { return direction == 0 || direction == 1; }
-
 Lab ClampLab(const Lab& lab) {
-    auto clamp = [](double v, double low, double high) { return v < low ? low : v > high ? high : v; };
-    return {clamp(lab.L, 0.0, 100.0), clamp(lab.a, -128.0, 127.0), clamp(lab.b, -128.0, 127.0)};
+    return {std::clamp(lab.L, 0.0, 100.0), std::clamp(lab.a, -128.0, 127.0), std::clamp(lab.b, -128.0, 127.0)};
 }
 
 }  // namespace

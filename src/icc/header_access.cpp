@@ -7,17 +7,6 @@
 namespace vantrel {
 namespace {
 
-uint32_t GetU32(const uint8_t* at) {
-    return uint32_t{at[0]} << 24 | uint32_t{at[1]} << 16 | uint32_t{at[2]} << 8 | uint32_t{at[3]};
-}
-
-void PutU32(uint8_t* at, uint32_t value) {
-    at[0] = static_cast<uint8_t>(value >> 24);
-    at[1] = static_cast<uint8_t>(value >> 16);
-    at[2] = static_cast<uint8_t>(value >> 8);
-    at[3] = static_cast<uint8_t>(value);
-}
-
 // The companding of the white-point Lab; its linear part ends in 0.138, not 16/116.
 double WhiteF(double t) { return t > 0.008856 ? std::pow(t, 1.0 / 3.0) : 7.787 * t + 0.138; }
 
@@ -35,24 +24,24 @@ void CProfil::SetDeviceClass(int kind) {
     if (name) std::memcpy(m_Header + 12, name, 4);
 }
 
-uint32_t CProfil::IlluminantX() const { return GetU32(m_Header + kIlluminantAt); }
-uint32_t CProfil::IlluminantY() const { return GetU32(m_Header + kIlluminantAt + 4); }
-uint32_t CProfil::IlluminantZ() const { return GetU32(m_Header + kIlluminantAt + 8); }
+uint32_t CProfil::IlluminantX() const { return LoadU32(m_Header + kIlluminantAt); }
+uint32_t CProfil::IlluminantY() const { return LoadU32(m_Header + kIlluminantAt + 4); }
+uint32_t CProfil::IlluminantZ() const { return LoadU32(m_Header + kIlluminantAt + 8); }
 
 void CProfil::SetIlluminant(uint32_t x, uint32_t y, uint32_t z) {
-    PutU32(m_Header + kIlluminantAt, x & 0xFFFF);
-    PutU32(m_Header + kIlluminantAt + 4, y);
-    PutU32(m_Header + kIlluminantAt + 8, z);
+    StoreU32(m_Header + kIlluminantAt, x & 0xFFFF);
+    StoreU32(m_Header + kIlluminantAt + 4, y);
+    StoreU32(m_Header + kIlluminantAt + 8, z);
 }
 
 void CProfil::SetMediaWhite(int direction, char axis, double value) {
-    if (direction != 0 && direction != 1) return;
+    if (!ValidDirection(direction)) return;
     const int index = axis == 'X' || axis == 'x' ? 0 : axis == 'Y' || axis == 'y' ? 1 : axis == 'Z' || axis == 'z' ? 2 : -1;
     if (index >= 0) m_MediaWhite[direction][index] = value;
 }
 
 Lab CProfil::WhiteLab(int direction) const {
-    if (direction != 0 && direction != 1) return {};
+    if (!ValidDirection(direction)) return {};
     const double* white = m_MediaWhite[direction];
     const double* illuminant = m_Illuminant[direction];
     if (illuminant[0] == 0 || illuminant[1] == 0 || illuminant[2] == 0) return {};
@@ -66,23 +55,15 @@ double CProfil::WhiteL(int direction) const { return WhiteLab(direction).L; }
 double CProfil::WhiteA(int direction) const { return WhiteLab(direction).a; }
 double CProfil::WhiteB(int direction) const { return WhiteLab(direction).b; }
 
-void CProfil::SetWhiteL(int direction, double lOver100) {
-    if (direction != 0 && direction != 1) return;
-    m_SlotWhite[direction][0] = lOver100;
+void CProfil::SetSlotWhite(int direction, int index, double value) {
+    if (!ValidDirection(direction)) return;
+    m_SlotWhite[direction][index] = value;
     MediaWhiteFromSlotWhite(direction);
 }
 
-void CProfil::SetWhiteA(int direction, double a) {
-    if (direction != 0 && direction != 1) return;
-    m_SlotWhite[direction][1] = a;
-    MediaWhiteFromSlotWhite(direction);
-}
-
-void CProfil::SetWhiteB(int direction, double b) {
-    if (direction != 0 && direction != 1) return;
-    m_SlotWhite[direction][2] = b;
-    MediaWhiteFromSlotWhite(direction);
-}
+void CProfil::SetWhiteL(int direction, double lOver100) { SetSlotWhite(direction, 0, lOver100); }
+void CProfil::SetWhiteA(int direction, double a) { SetSlotWhite(direction, 1, a); }
+void CProfil::SetWhiteB(int direction, double b) { SetSlotWhite(direction, 2, b); }
 
 void CProfil::MediaWhiteFromSlotWhite(int direction) {
     const double L = 100.0 * m_SlotWhite[direction][0];
@@ -95,7 +76,7 @@ void CProfil::MediaWhiteFromSlotWhite(int direction) {
 }
 
 int64_t CProfil::FindWhitePointOffset(int direction, const std::string& path) {
-    if (direction != 0 && direction != 1) return -1;
+    if (!ValidDirection(direction)) return -1;
     IccBytes file;
     if (!file.Load(path)) return -1;
     return FindXyzData(file, "wtpt");

@@ -6,12 +6,16 @@ namespace vantrel {
 
 bool IccBytes::Load(const std::string& path) {
     bytes_.clear();
-    CFile file(path, CFile::kBinary);
-    const int64_t size = file.Size();
-    if (size < 0 || static_cast<uint64_t>(size) > kMaxFileSize) return false;
-    std::string bytes(static_cast<size_t>(size), '\0');
-    if (file.Read(bytes.data(), bytes.size()) != bytes.size()) return false;
+    std::string bytes;
+    if (!ReadWholeFile(path, bytes, kMaxFileSize)) return false;
     bytes_.swap(bytes);
+    return true;
+}
+
+bool V4ClutHeadMatches(const IccBytes& file, uint64_t head, int inputs, int grid) {
+    if (!file.Has(head, 20) || file.U8(head + 16) != 2) return false;
+    for (int i = 0; i < inputs; ++i)
+        if (file.U8(head + static_cast<uint64_t>(i)) != grid) return false;
     return true;
 }
 

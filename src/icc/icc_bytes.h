@@ -48,6 +48,26 @@ private:
     std::string bytes_;
 };
 
+// Big-endian 32-bit words in memory (the header and the bytes a patch writes).
+inline uint32_t LoadU32(const uint8_t* at) {
+    return uint32_t{at[0]} << 24 | uint32_t{at[1]} << 16 | uint32_t{at[2]} << 8 | uint32_t{at[3]};
+}
+inline void StoreU32(uint8_t* at, uint32_t value) {
+    at[0] = static_cast<uint8_t>(value >> 24);
+    at[1] = static_cast<uint8_t>(value >> 16);
+    at[2] = static_cast<uint8_t>(value >> 8);
+    at[3] = static_cast<uint8_t>(value);
+}
+
+// The tag types whose tables LoadLut unpacks.
+inline bool IsLutType(const std::string& type) {
+    return type == "mft1" || type == "mft2" || type == "mAB " || type == "mBA ";
+}
+
+// True when a v4 CLUT head at `head` (a grid byte per input, the precision byte at 16, 20 bytes
+// in all) lies inside the file and describes a 16-bit CLUT of `grid` points on each of `inputs`.
+bool V4ClutHeadMatches(const IccBytes& file, uint64_t head, int inputs, int grid);
+
 // File position of the three numbers of the first `signature` tag ("wtpt") when it is an XYZ
 // number lying inside the file; -1 otherwise.
 int64_t FindXyzData(const IccBytes& file, const char* signature);

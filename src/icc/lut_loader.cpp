@@ -52,6 +52,14 @@ void StretchLegacy(uint16_t* values, size_t count, size_t step) {
     for (size_t k = 0; k < count; k += step) values[k] = Round16(values[k] * 257.0 / 256.0);
 }
 
+// An input curve of `fileEntries` samples as held: resampled to 256 entries when shorter, else as read.
+void HoldInputCurve(const std::vector<uint16_t>& samples, uint64_t fileEntries, uint64_t held, uint16_t* curve) {
+    if (fileEntries < held)
+        ResampleCurve(samples.data(), static_cast<int>(fileEntries), curve);
+    else
+        std::copy(samples.begin(), samples.begin() + static_cast<std::ptrdiff_t>(held), curve);
+}
+
 // grid^inputs, or 0 when the CLUT would exceed kMaxClutValues with `outputs` values per node.
 uint64_t ClutNodes(int grid, int inputs, int outputs) {
     uint64_t nodes = 1;
@@ -78,8 +86,14 @@ std::string CutSignature(std::string value) {
 }  // namespace
 
 int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::string& path) {
-    if (direction != 0 && direction != 1) return -1;
+    if (!ValidDirection(direction)) return -1;
     const int slot = direction;
+    // A table that cannot be held leaves the slot empty, with the white of an empty slot.
+    auto unusable = [&] {
+        ResetSlot(slot);
+        ComputeSlotWhite(direction, slot);
+        return -1;
+    };
     m_FileInputEntries[slot] = 0;
     m_OutputIdentity[slot] = 0;
     std::fill(std::begin(m_Eval), std::end(m_Eval), 0.0);
@@ -144,14 +158,11 @@ int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::strin
     const int n = lut.inputChannels;
     const int m = lut.outputChannels;
     const int grid = lut.gridPoints;
-    const bool isLut = lut.type == "mft1" || lut.type == "mft2" || lut.type == "mAB " || lut.type == "mBA ";
     const uint64_t nodes = ClutNodes(grid, n, m);
-    if ((!isLut && lut.type != "MATR") || n < 1 || n > kMaxInputs || m < 1 || m > kMaxOutputs || grid < kMinGrid ||
+    if ((!IsLutType(lut.type) && lut.type != "MATR") || n < 1 || n > kMaxInputs || m < 1 || m > kMaxOutputs || grid < kMinGrid ||
         grid > kMaxGrid || lut.inputEntries < kMinEntries || lut.inputEntries > kMaxEntries ||
         lut.outputEntries < kMinEntries || lut.outputEntries > kMaxEntries || nodes == 0) {
-        ResetSlot(slot);
-        ComputeSlotWhite(direction, slot);
-        return -1;
+        return unusable();
     }
 
     m_Corners[slot] = 1 << n;
@@ -210,21 +221,13 @@ int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::strin
     }
 
     IccBytes file;
-    if (!file.Load(path) || !file.Has(0, kHeaderSize)) {
-        ResetSlot(slot);
-        ComputeSlotWhite(direction, slot);
-        return -1;
-    }
+    if (!file.Load(path) || !file.Has(0, kHeaderSize)) return unusable();
     lut.colourSpace = file.Signature(16);
     lut.pcs = CutSignature(file.Signature(20));
 
     const int32_t loaded = LoadTables(slot, file);
     if (loaded == -2) return -2;
-    if (loaded != 1) {
-        ResetSlot(slot);
-        ComputeSlotWhite(direction, slot);
-        return -1;
-    }
+    if (loaded != 1) return unusable();
 
     if (lut.pcs == "Lab" && lut.colourSpace == "RGB " && lut.type == "MATR") lut.pcs = "XYZ";
     ComputeSlotWhite(direction, slot);
@@ -239,7 +242,7 @@ int32_t CProfil::LoadTables(int slot, const IccBytes& file) {
     const uint64_t n = static_cast<uint64_t>(lut.inputChannels);
     const uint64_t m = static_cast<uint64_t>(lut.outputChannels);
     const uint64_t held = static_cast<uint64_t>(lut.inputEntries);
-    const uint64_t fileEntries = m_FileInputEntries[slot] ? static_cast<uint64_t>(m_FileInputEntries[slot]) : held;
+    const uint64_t fileEntries = static_cast<uint64_t>(InputEntriesInFile(slot));
     const uint64_t outEntries = static_cast<uint64_t>(lut.outputEntries);
     const uint64_t clutValues = ClutNodes(lut.gridPoints, lut.inputChannels, lut.outputChannels) * m;
 
@@ -271,28 +274,20 @@ int32_t CProfil::LoadTables(int slot, const IccBytes& file) {
             clut.resize(clutValues);
             output.resize(m * outEntries);
             uint64_t at = start;
+            auto next = [&file, &at] {
+                const uint16_t value = file.U16(at);
+                at += 2;
+                return value;
+            };
             std::vector<uint16_t> samples(fileEntries);
             for (uint64_t channel = 0; channel < n; ++channel) {
-                for (uint16_t& value : samples) {
-                    value = file.U16(at);
-                    at += 2;
-                }
+                for (uint16_t& value : samples) value = next();
                 uint16_t* curve = input.data() + channel * held;
-                if (fileEntries < held) {
-                    ResampleCurve(samples.data(), static_cast<int>(fileEntries), curve);
-                } else {
-                    std::copy(samples.begin(), samples.end(), curve);
-                    if (curve[held - 1] == kLegacyWhite) StretchLegacy(curve, held, 1);
-                }
+                HoldInputCurve(samples, fileEntries, held, curve);
+                if (fileEntries >= held && curve[held - 1] == kLegacyWhite) StretchLegacy(curve, held, 1);
             }
-            for (uint16_t& value : clut) {
-                value = file.U16(at);
-                at += 2;
-            }
-            for (uint16_t& value : output) {
-                value = file.U16(at);
-                at += 2;
-            }
+            for (uint16_t& value : clut) value = next();
+            for (uint16_t& value : output) value = next();
             for (uint64_t channel = 0; channel < m; ++channel) {
                 uint16_t* curve = output.data() + channel * outEntries;
                 if (curve[outEntries - 1] == kLegacyWhite) StretchLegacy(curve, outEntries, 1);
@@ -308,12 +303,11 @@ int32_t CProfil::LoadTables(int slot, const IccBytes& file) {
         const uint64_t inputSide = tag + file.U32(tag + (ab ? 28 : 12));
         const uint64_t outputSide = tag + file.U32(tag + (ab ? 12 : 28));
         const uint64_t clutAt = tag + file.U32(tag + 24);
-        if (!file.Has(clutAt, 20) || file.U8(clutAt + 16) != 2) return -1;
-        for (uint64_t i = 0; i < n; ++i)
-            if (file.U8(clutAt + i) != lut.gridPoints) return -1;
-        if (!file.Has(clutAt + 20, 2 * clutValues)) return -1;
+        if (!V4ClutHeadMatches(file, clutAt, lut.inputChannels, lut.gridPoints) ||
+            !file.Has(clutAt + 20, 2 * clutValues))
+            return -1;
 
-        // Reads `channels` curves of `count` entries each from `at` into `out` (`stride` apart).
+        // Reads `channels` curves of `count` entries each from `at`, handing each to `store`.
         auto readCurves = [&file](uint64_t at, uint64_t channels, uint64_t count, std::vector<uint16_t>& samples,
                                   auto&& store) -> bool {
             for (uint64_t channel = 0; channel < channels; ++channel) {
@@ -330,11 +324,7 @@ int32_t CProfil::LoadTables(int slot, const IccBytes& file) {
         output.resize(m * outEntries);
         std::vector<uint16_t> samples(std::max(fileEntries, outEntries));
         const bool inputsRead = readCurves(inputSide, n, fileEntries, samples, [&](uint64_t channel) {
-            uint16_t* curve = input.data() + channel * held;
-            if (fileEntries < held)
-                ResampleCurve(samples.data(), static_cast<int>(fileEntries), curve);
-            else
-                std::copy(samples.begin(), samples.begin() + static_cast<std::ptrdiff_t>(held), curve);
+            HoldInputCurve(samples, fileEntries, held, input.data() + channel * held);
         });
         if (!inputsRead) return -1;
         for (uint64_t k = 0; k < clutValues; ++k) clut[k] = file.U16(clutAt + 20 + 2 * k);

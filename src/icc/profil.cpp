@@ -2,26 +2,18 @@
 
 #include <cstring>
 
+#include "icc/icc_bytes.h"
+
 namespace vantrel {
-namespace {
-
-void PutU32(uint8_t* at, uint32_t value) {
-    at[0] = static_cast<uint8_t>(value >> 24);
-    at[1] = static_cast<uint8_t>(value >> 16);
-    at[2] = static_cast<uint8_t>(value >> 8);
-    at[3] = static_cast<uint8_t>(value);
-}
-
-}  // namespace
 
 CProfil::CProfil() {
     // A profile that has read nothing describes a D50 printer profile.
     std::memcpy(m_Header + 4, "appl", 4);
     std::memcpy(m_Header + 12, "prtr", 4);
     std::memcpy(m_Header + 36, "acsp", 4);
-    PutU32(m_Header + 68, 63188);
-    PutU32(m_Header + 72, 65535);
-    PutU32(m_Header + 76, 54059);
+    StoreU32(m_Header + 68, 63188);
+    StoreU32(m_Header + 72, 65535);
+    StoreU32(m_Header + 76, 54059);
 }
 
 void CProfil::Release() {

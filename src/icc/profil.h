@@ -223,7 +223,14 @@ public:
     // Slot 0 doubles as the release marker (kReleasedMarker).
     int32_t m_Precision[2] = {0, 0};
 
+    // Entries per input curve as the file holds them (the held curves of shorter ones have 256).
+    int32_t InputEntriesInFile(int slot) const {
+        return m_FileInputEntries[slot] ? m_FileInputEntries[slot] : m_Lut[slot].inputEntries;
+    }
+
 private:
+    static bool ValidDirection(int direction) { return direction == 0 || direction == 1; }
+    void SetSlotWhite(int direction, int index, double value);
     bool ReadTag(const IccBytes& file, int direction, uint32_t index, int& colorants);
     void ResetSlot(int slot);
     int32_t LoadTables(int slot, const IccBytes& file);

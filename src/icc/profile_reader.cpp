@@ -14,10 +14,6 @@ constexpr uint32_t kMaxTags = 4096;
 // A "curv" element: signature, reserved, 32-bit count, then the 16-bit entries.
 constexpr uint64_t kCurveHead = 12;
 
-bool IsLutType(const std::string& type) {
-    return type == "mft1" || type == "mft2" || type == "mAB " || type == "mBA ";
-}
-
 // The channel of a colorant or TRC tag, -1 for other signatures.
 int RgbChannel(const std::string& signature, const char* suffix) {
     static const char kChannels[] = "rgb";
@@ -131,7 +127,7 @@ bool CProfil::ReadTag(const IccBytes& file, int direction, uint32_t i, int& colo
 }
 
 void CProfil::ReadTagTable(int direction, const std::string& path) {
-    if (direction != 0 && direction != 1) return;
+    if (!ValidDirection(direction)) return;
     IccBytes file;
     if (!file.Load(path) || !file.Has(0, kHeaderSize)) return;
 

@@ -8,15 +8,6 @@
 namespace vantrel {
 namespace {
 
-bool ValidDirection(int direction) { return direction == 0 || direction == 1; }
-
-void PutU32(uint8_t* at, uint32_t value) {
-    at[0] = static_cast<uint8_t>(value >> 24);
-    at[1] = static_cast<uint8_t>(value >> 16);
-    at[2] = static_cast<uint8_t>(value >> 8);
-    at[3] = static_cast<uint8_t>(value);
-}
-
 // round(value x 65536) as an s15Fixed16Number, kept inside its range.
 uint32_t ToFixed16(double value) {
     double scaled = std::floor(value * 65536.0 + 0.5);
@@ -62,18 +53,15 @@ uint64_t LoadedClutPosition(const CProfil& p, int direction, const IccBytes& fil
         clut = tag + 48 + n * 256;
         width = 1;
     } else if (lut.type == "mft2") {
-        const uint64_t entries =
-            p.m_FileInputEntries[slot] ? static_cast<uint64_t>(p.m_FileInputEntries[slot]) : uint64_t(lut.inputEntries);
+        const uint64_t entries = static_cast<uint64_t>(p.InputEntriesInFile(slot));
         if (file.U8(tag + 10) != lut.gridPoints || file.U16(tag + 48) != entries ||
             file.U16(tag + 50) != static_cast<uint64_t>(lut.outputEntries))
             return 0;
         clut = tag + 52 + n * entries * 2;
     } else {
-        // mAB / mBA: the CLUT head (grid per input, precision byte, padding) takes 20 bytes.
+        // mAB / mBA: the values follow the 20-byte CLUT head.
         const uint64_t head = tag + file.U32(tag + 24);
-        if (!file.Has(head, 20) || file.U8(head + 16) != 2) return 0;
-        for (uint64_t i = 0; i < n; ++i)
-            if (file.U8(head + i) != lut.gridPoints) return 0;
+        if (!V4ClutHeadMatches(file, head, lut.inputChannels, lut.gridPoints)) return 0;
         clut = head + 20;
     }
     return file.Has(clut, values * width) ? clut : 0;
@@ -118,7 +106,7 @@ bool CProfil::WriteWhitePoint(int direction, const std::string& path) {
     const int64_t position = FindXyzData(file, "wtpt");
     if (position < 0) return false;
     std::vector<uint8_t> bytes(12);
-    for (int axis = 0; axis < 3; ++axis) PutU32(bytes.data() + 4 * axis, ToFixed16(m_MediaWhite[direction][axis]));
+    for (int axis = 0; axis < 3; ++axis) StoreU32(bytes.data() + 4 * axis, ToFixed16(m_MediaWhite[direction][axis]));
     return Patch(path, position, bytes);
 }
 

@@ -14,6 +14,20 @@ constexpr int kLastPosition = kPositions - 1;
 
 int RoundHalfUp(double value) { return static_cast<int>(value + 0.5); }
 
+// A natural spline through `count` samples spread evenly over the working grid, their values
+// divided by 257 and multiplied by `scale`, evaluated at every grid position.
+void SplineThroughSamples(const uint16_t* samples, int count, double scale, std::vector<double>& grid) {
+    std::vector<double> x(static_cast<size_t>(count));
+    std::vector<double> y(static_cast<size_t>(count));
+    for (int k = 0; k < count; ++k) {
+        x[static_cast<size_t>(k)] = k * static_cast<double>(kLastPosition) / (count - 1);
+        y[static_cast<size_t>(k)] = scale * samples[k] / 257.0;
+    }
+    NaturalSpline spline;
+    FitSpline(x, y, spline);
+    EvaluateSplineGrid(spline, grid);
+}
+
 // Inverts a table of cells (0 = empty) into the 256-entry curve: read directly when every cell
 // from 1 on is filled, else through a spline over the filled cells and the origin.
 // `scale` divides the cell values on their way into the curve.
@@ -93,16 +107,8 @@ void BuildSampledCurve(const uint16_t* samples, int count, std::vector<double>& 
             }
             built[255] = samples[count - 1] / 257.0;
         } else {
-            std::vector<double> x(static_cast<size_t>(count));
-            std::vector<double> y(static_cast<size_t>(count));
-            for (int k = 0; k < count; ++k) {
-                x[static_cast<size_t>(k)] = k * static_cast<double>(kLastPosition) / (count - 1);
-                y[static_cast<size_t>(k)] = samples[k] / 257.0;
-            }
-            NaturalSpline spline;
-            FitSpline(x, y, spline);
             std::vector<double> grid;
-            EvaluateSplineGrid(spline, grid);
+            SplineThroughSamples(samples, count, 1.0, grid);
             for (int i = 0; i < 255; ++i) built[static_cast<size_t>(i)] = grid[static_cast<size_t>(16 * i)];
             built[255] = grid[kLastPosition];
         }
@@ -127,16 +133,8 @@ void BuildInverseCurve(const uint16_t* samples, int count, std::vector<double>& 
             }
             cells[kLastPosition] = kPositions;
         } else {
-            std::vector<double> x(static_cast<size_t>(count));
-            std::vector<double> y(static_cast<size_t>(count));
-            for (int k = 0; k < count; ++k) {
-                x[static_cast<size_t>(k)] = k * static_cast<double>(kLastPosition) / (count - 1);
-                y[static_cast<size_t>(k)] = 16.0 * samples[k] / 257.0;
-            }
-            NaturalSpline spline;
-            FitSpline(x, y, spline);
             std::vector<double> forward;
-            EvaluateSplineGrid(spline, forward);
+            SplineThroughSamples(samples, count, 16.0, forward);
             for (int i = 0; i < kPositions; ++i)
                 cells[static_cast<size_t>(RoundHalfUp(forward[static_cast<size_t>(i)]))] = i;
         }

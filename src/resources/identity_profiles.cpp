@@ -1,14 +1,18 @@
 #include "resources/identity_profiles.h"
 
 #include <cstring>
+#include <initializer_list>
 
 namespace vantrel {
 namespace {
 
 // Hosts recognise the neutral Lab-to-Lab profile by its size, so it is padded to it.
 constexpr size_t kNeutral3ccSize = 714612;
+// D50 as s15Fixed16Numbers, the header illuminant and the neutral profile's white.
+constexpr uint32_t kD50[3] = {0x0000F6D6, 0x00010000, 0x0000D32D};
+constexpr const char* kCopyright = "No copyright, use freely";
 
-class IccBytes {
+class ByteWriter {
 public:
     std::vector<uint8_t> bytes;
 
@@ -24,6 +28,11 @@ public:
     void Sig(const char* s) {
         for (int i = 0; i < 4; ++i) U8(static_cast<unsigned char>(s[i]));
     }
+    // A tag element's head: its type signature and the reserved word.
+    void Head(const char* type) {
+        Sig(type);
+        U32(0);
+    }
     void Zeros(size_t n) { bytes.insert(bytes.end(), n, 0); }
     void Align4() { Zeros((4 - bytes.size() % 4) % 4); }
     void PutU32At(size_t at, uint32_t v) {
@@ -38,9 +47,8 @@ uint16_t Ramp(unsigned k, unsigned entries) {
 
 // An identity lut16Type: n channels in and out, `grid` points, identity curves.
 std::vector<uint8_t> IdentityMft2(unsigned channels, unsigned grid, unsigned inEntries, unsigned outEntries) {
-    IccBytes t;
-    t.Sig("mft2");
-    t.U32(0);
+    ByteWriter t;
+    t.Head("mft2");
     t.U8(channels);
     t.U8(channels);
     t.U8(grid);
@@ -68,10 +76,9 @@ std::vector<uint8_t> IdentityMft2(unsigned channels, unsigned grid, unsigned inE
 }
 
 std::vector<uint8_t> TextDescription(const char* text) {
-    IccBytes t;
+    ByteWriter t;
     const size_t n = std::strlen(text) + 1;
-    t.Sig("desc");
-    t.U32(0);
+    t.Head("desc");
     t.U32(static_cast<uint32_t>(n));
     for (size_t i = 0; i < n; ++i) t.U8(static_cast<unsigned char>(text[i]));
     t.U32(0);   // Unicode language code
@@ -83,29 +90,18 @@ std::vector<uint8_t> TextDescription(const char* text) {
 }
 
 std::vector<uint8_t> Text(const char* text) {
-    IccBytes t;
-    t.Sig("text");
-    t.U32(0);
+    ByteWriter t;
+    t.Head("text");
     for (const char* c = text; *c; ++c) t.U8(static_cast<unsigned char>(*c));
     t.U8(0);
     return t.bytes;
 }
 
-std::vector<uint8_t> D50Xyz() {
-    IccBytes t;
-    t.Sig("XYZ ");
-    t.U32(0);
-    t.U32(0x0000F6D6);
-    t.U32(0x00010000);
-    t.U32(0x0000D32D);
-    return t.bytes;
-}
-
-std::vector<uint8_t> EmptySequence() {
-    IccBytes t;
-    t.Sig("pseq");
-    t.U32(0);
-    t.U32(0);
+// An element of 32-bit words: an "XYZ " number, an empty "pseq".
+std::vector<uint8_t> Words(const char* type, std::initializer_list<uint32_t> words) {
+    ByteWriter t;
+    t.Head(type);
+    for (uint32_t w : words) t.U32(w);
     return t.bytes;
 }
 
@@ -117,7 +113,7 @@ struct Tag {
 std::vector<uint8_t> Assemble(const char* deviceClass, const char* dataSpace, const char* pcs,
                               const std::vector<std::vector<uint8_t>>& elements, const std::vector<Tag>& tags,
                               size_t paddedSize) {
-    IccBytes p;
+    ByteWriter p;
     p.U32(0);  // size, patched below
     p.Sig("vtrl");
     p.U32(0x02400000);
@@ -132,9 +128,7 @@ std::vector<uint8_t> Assemble(const char* deviceClass, const char* dataSpace, co
     p.U32(0);  // model
     p.Zeros(8);  // attributes
     p.U32(0);  // rendering intent
-    p.U32(0x0000F6D6);
-    p.U32(0x00010000);
-    p.U32(0x0000D32D);
+    for (uint32_t v : kD50) p.U32(v);
     p.Sig("vtrl");
     p.Zeros(128 - p.bytes.size());
     p.U32(static_cast<uint32_t>(tags.size()));
@@ -161,8 +155,8 @@ std::vector<uint8_t> Assemble(const char* deviceClass, const char* dataSpace, co
 std::vector<uint8_t> Neutral3cc() {
     std::vector<std::vector<uint8_t>> elements = {
         TextDescription("Neutral Lab to Lab correction"),
-        Text("No copyright, use freely"),
-        D50Xyz(),
+        Text(kCopyright),
+        Words("XYZ ", {kD50[0], kD50[1], kD50[2]}),
         IdentityMft2(3, 33, 511, 511),
         IdentityMft2(3, 33, 4081, 4081),
     };
@@ -174,8 +168,8 @@ std::vector<uint8_t> Neutral3cc() {
 std::vector<uint8_t> NeutralLink(const char* space, unsigned channels, const char* description) {
     std::vector<std::vector<uint8_t>> elements = {
         TextDescription(description),
-        Text("No copyright, use freely"),
-        EmptySequence(),
+        Text(kCopyright),
+        Words("pseq", {0}),  // no profiles in the sequence
         IdentityMft2(channels, 5, 256, 256),
     };
     std::vector<Tag> tags = {{"desc", 0}, {"cprt", 1}, {"pseq", 2}, {"A2B0", 3}};

@@ -1,6 +1,7 @@
 #include "support/cfile.h"
 
 #include <climits>
+#include <cstdint>
 
 #include <sys/stat.h>
 
@@ -60,10 +61,11 @@ int64_t CFile::Size() const {
     return static_cast<int64_t>(st.st_size);
 }
 
-bool ReadWholeFile(const std::string& path, std::string& bytes) {
+bool ReadWholeFile(const std::string& path, std::string& bytes, uint64_t maxSize) {
     CFile file(path, CFile::kBinary);
     const int64_t size = file.Size();
-    if (size < 0) return false;
+    // A 32-bit host cannot hold more than SIZE_MAX bytes in one string.
+    if (size < 0 || static_cast<uint64_t>(size) > maxSize || static_cast<uint64_t>(size) > SIZE_MAX) return false;
     bytes.assign(static_cast<size_t>(size), '\0');
     return file.Read(bytes.data(), bytes.size()) == bytes.size();
 }

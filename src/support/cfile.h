@@ -40,8 +40,8 @@ private:
     std::FILE* stream_ = nullptr;
 };
 
-// Reads a whole file; false when it cannot be opened or read.
-bool ReadWholeFile(const std::string& path, std::string& bytes);
+// Reads a whole file; false when it cannot be opened or read, or is larger than `maxSize` bytes.
+bool ReadWholeFile(const std::string& path, std::string& bytes, uint64_t maxSize = UINT64_MAX);
 // Copies a file byte for byte; the copy is skipped (false) when the source cannot be read.
 bool CopyWholeFile(const std::string& from, const std::string& to);
 
