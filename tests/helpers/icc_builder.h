@@ -1,5 +1,5 @@
 #pragma once
-// Small ICC profiles for tests, built as byte vectors.
+// Small v2 ICC profiles for tests, built as byte vectors.
 //
 //   using namespace vantrel::test;
 //   LutSpec lut = MakeLut(4, 3, 5, [](const std::vector<int>& node, int out) { ... });  // CMYK -> Lab
@@ -8,9 +8,10 @@
 //   std::string path = WriteFile(dir.File("p.icc"), profile.Build());
 //
 // Tags are laid out in the order added, each 4-byte aligned, after the header and tag table.
-// For malformed variants edit the built bytes: PutU32/PutU16 at TagOffset(bytes, i) and friends,
-// or truncate the vector.
+// For malformed variants edit the built bytes (Put at TagOffset(bytes, i)) or truncate them.
 
+#include <algorithm>
+#include <array>
 #include <cmath>
 #include <cstdint>
 #include <fstream>
@@ -23,38 +24,23 @@ namespace vantrel::test {
 
 using Bytes = std::vector<uint8_t>;
 
-// ---- big-endian helpers ------------------------------------------------------------------------
-inline void AppendU8(Bytes& b, unsigned v) { b.push_back(static_cast<uint8_t>(v)); }
-inline void AppendU16(Bytes& b, unsigned v) {
-    b.push_back(static_cast<uint8_t>(v >> 8));
-    b.push_back(static_cast<uint8_t>(v));
+// ---- big-endian numbers --------------------------------------------------------------------------
+// `width` bytes of `v`, appended or put at `at`.
+inline void Append(Bytes& b, uint32_t v, int width) {
+    for (int k = width - 1; k >= 0; --k) b.push_back(static_cast<uint8_t>(v >> 8 * k));
 }
-inline void AppendU32(Bytes& b, uint32_t v) {
-    AppendU16(b, v >> 16);
-    AppendU16(b, v & 0xFFFF);
+inline void Put(Bytes& b, size_t at, uint32_t v, int width) {
+    for (int k = 0; k < width; ++k) b[at + static_cast<size_t>(k)] = static_cast<uint8_t>(v >> 8 * (width - 1 - k));
 }
-inline void AppendSig(Bytes& b, const char* sig) {
-    for (int k = 0; k < 4; ++k) b.push_back(static_cast<uint8_t>(sig[k]));
-}
+inline void AppendSig(Bytes& b, const char* sig) { b.insert(b.end(), sig, sig + 4); }
 // s15Fixed16Number, rounded to the nearest.
 inline uint32_t Fixed16(double v) { return static_cast<uint32_t>(static_cast<int32_t>(std::lround(v * 65536.0))); }
-inline void AppendFixed(Bytes& b, double v) { AppendU32(b, Fixed16(v)); }
-inline void PutU16(Bytes& b, size_t at, unsigned v) {
-    b[at] = static_cast<uint8_t>(v >> 8);
-    b[at + 1] = static_cast<uint8_t>(v);
-}
-inline void PutU32(Bytes& b, size_t at, uint32_t v) {
-    PutU16(b, at, v >> 16);
-    PutU16(b, at + 2, v & 0xFFFF);
-}
 inline uint32_t GetU32(const Bytes& b, size_t at) {
     return uint32_t{b[at]} << 24 | uint32_t{b[at + 1]} << 16 | uint32_t{b[at + 2]} << 8 | b[at + 3];
 }
-inline unsigned GetU16(const Bytes& b, size_t at) { return unsigned{b[at]} << 8 | b[at + 1]; }
-// Position of the i-th (0-based) tag-table record, and that tag's data offset and size.
+// Position of the i-th (0-based) tag-table record, and that tag's data offset.
 inline size_t TagRecord(size_t i) { return 132 + 12 * i; }
 inline uint32_t TagOffset(const Bytes& b, size_t i) { return GetU32(b, TagRecord(i) + 4); }
-inline uint32_t TagSize(const Bytes& b, size_t i) { return GetU32(b, TagRecord(i) + 8); }
 
 // ---- LUT contents ------------------------------------------------------------------------------
 // A LUT's tables as 16-bit values (an mft1 keeps only the low byte; give it 0..255 values).
@@ -65,7 +51,6 @@ struct LutSpec {
     std::vector<std::vector<uint16_t>> inputCurves;   // one per input channel
     std::vector<uint16_t> clut;                       // grid^inputs x outputs, first input slowest
     std::vector<std::vector<uint16_t>> outputCurves;  // one per output channel
-    double matrix[9] = {1, 0, 0, 0, 1, 0, 0, 0, 1};
 };
 
 // A straight curve of `entries` values from 0 to `top`.
@@ -81,144 +66,49 @@ inline std::vector<uint16_t> LinearCurve(int entries, unsigned top = 65535) {
 inline LutSpec MakeLut(int inputs, int outputs, int grid,
                        const std::function<uint16_t(const std::vector<int>&, int)>& value, int inEntries = 2,
                        int outEntries = 2, unsigned curveTop = 65535) {
-    LutSpec lut;
-    lut.inputs = inputs;
-    lut.outputs = outputs;
-    lut.grid = grid;
+    LutSpec lut{inputs, outputs, grid, {}, {}, {}};
     lut.inputCurves.assign(static_cast<size_t>(inputs), LinearCurve(inEntries, curveTop));
     lut.outputCurves.assign(static_cast<size_t>(outputs), LinearCurve(outEntries, curveTop));
-    size_t nodes = 1;
-    for (int i = 0; i < inputs; ++i) nodes *= static_cast<size_t>(grid);
     std::vector<int> index(static_cast<size_t>(inputs), 0);
-    for (size_t node = 0; node < nodes; ++node) {
-        size_t rest = node;
-        for (int i = inputs - 1; i >= 0; --i) {
-            index[static_cast<size_t>(i)] = static_cast<int>(rest % static_cast<size_t>(grid));
-            rest /= static_cast<size_t>(grid);
-        }
+    for (bool more = true; more;) {
         for (int out = 0; out < outputs; ++out) lut.clut.push_back(value(index, out));
+        more = false;  // the last input counts fastest
+        for (int i = inputs - 1; i >= 0 && !more; --i) {
+            more = ++index[static_cast<size_t>(i)] < grid;
+            if (!more) index[static_cast<size_t>(i)] = 0;
+        }
     }
     return lut;
 }
 
 // ---- tag data ----------------------------------------------------------------------------------
-inline void Pad4(Bytes& b) {
-    while (b.size() % 4) b.push_back(0);
-}
-
-// "mft2": 16-bit tables; the curves' lengths give the entry counts.
-inline Bytes Mft2Tag(const LutSpec& lut) {
+// "mft2" (16-bit values; the curves' lengths give the entry counts) or "mft1" (one byte per value,
+// 256-entry curves); identity matrix.
+inline Bytes LutTag(const LutSpec& lut, bool sixteenBit) {
     Bytes b;
-    AppendSig(b, "mft2");
-    AppendU32(b, 0);
-    AppendU8(b, static_cast<unsigned>(lut.inputs));
-    AppendU8(b, static_cast<unsigned>(lut.outputs));
-    AppendU8(b, static_cast<unsigned>(lut.grid));
-    AppendU8(b, 0);
-    for (double v : lut.matrix) AppendFixed(b, v);
-    AppendU16(b, static_cast<unsigned>(lut.inputCurves.at(0).size()));
-    AppendU16(b, static_cast<unsigned>(lut.outputCurves.at(0).size()));
-    for (const auto& curve : lut.inputCurves)
-        for (uint16_t v : curve) AppendU16(b, v);
-    for (uint16_t v : lut.clut) AppendU16(b, v);
-    for (const auto& curve : lut.outputCurves)
-        for (uint16_t v : curve) AppendU16(b, v);
-    return b;
-}
-
-// "mft1": one byte per value; curves must have 256 entries.
-inline Bytes Mft1Tag(const LutSpec& lut) {
-    Bytes b;
-    AppendSig(b, "mft1");
-    AppendU32(b, 0);
-    AppendU8(b, static_cast<unsigned>(lut.inputs));
-    AppendU8(b, static_cast<unsigned>(lut.outputs));
-    AppendU8(b, static_cast<unsigned>(lut.grid));
-    AppendU8(b, 0);
-    for (double v : lut.matrix) AppendFixed(b, v);
-    for (const auto& curve : lut.inputCurves)
-        for (uint16_t v : curve) AppendU8(b, v & 0xFF);
-    for (uint16_t v : lut.clut) AppendU8(b, v & 0xFF);
-    for (const auto& curve : lut.outputCurves)
-        for (uint16_t v : curve) AppendU8(b, v & 0xFF);
-    return b;
-}
-
-// A "curv" element/tag: no entries = identity, one entry = gamma as u8Fixed8 (raw value).
-inline Bytes CurvTag(const std::vector<uint16_t>& entries) {
-    Bytes b;
-    AppendSig(b, "curv");
-    AppendU32(b, 0);
-    AppendU32(b, static_cast<uint32_t>(entries.size()));
-    for (uint16_t v : entries) AppendU16(b, v);
-    return b;
-}
-inline Bytes GammaCurvTag(double gamma) { return CurvTag({static_cast<uint16_t>(std::lround(gamma * 256.0))}); }
-
-// A "para" function type 0 (plain gamma), the v4 form this library does not read.
-inline Bytes ParaTag(double gamma) {
-    Bytes b;
-    AppendSig(b, "para");
-    AppendU32(b, 0);
-    AppendU16(b, 0);
-    AppendU16(b, 0);
-    AppendFixed(b, gamma);
-    return b;
-}
-
-// "mAB " (or "mBA " when `mba`): A curves, CLUT (16-bit), B curves; no matrix and no M curves.
-// The input side takes lut.inputCurves, the output side lut.outputCurves.
-inline Bytes MabTag(const LutSpec& lut, bool mba = false) {
-    Bytes b;
-    AppendSig(b, mba ? "mBA " : "mAB ");
-    AppendU32(b, 0);
-    AppendU8(b, static_cast<unsigned>(lut.inputs));
-    AppendU8(b, static_cast<unsigned>(lut.outputs));
-    AppendU16(b, 0);
-    const size_t offsets = b.size();
-    for (int k = 0; k < 5; ++k) AppendU32(b, 0);  // B, matrix, M, CLUT, A
-    auto curves = [&b](const std::vector<std::vector<uint16_t>>& set) {
-        const size_t at = b.size();
-        for (const auto& curve : set) {
-            Bytes element = CurvTag(curve);
-            b.insert(b.end(), element.begin(), element.end());
-            Pad4(b);
-        }
-        return static_cast<uint32_t>(at);
+    AppendSig(b, sixteenBit ? "mft2" : "mft1");
+    Append(b, 0, 4);
+    for (int count : {lut.inputs, lut.outputs, lut.grid, 0}) Append(b, static_cast<uint32_t>(count), 1);
+    for (int k = 0; k < 9; ++k) Append(b, k % 4 == 0 ? 0x10000 : 0, 4);
+    if (sixteenBit) {
+        Append(b, static_cast<uint32_t>(lut.inputCurves.at(0).size()), 2);
+        Append(b, static_cast<uint32_t>(lut.outputCurves.at(0).size()), 2);
+    }
+    auto values = [&b, sixteenBit](const std::vector<uint16_t>& table) {
+        for (uint16_t v : table) Append(b, sixteenBit ? v : v & 0xFF, sixteenBit ? 2 : 1);
     };
-    const auto& inputSide = lut.inputCurves;
-    const auto& outputSide = lut.outputCurves;
-    const uint32_t first = curves(mba ? outputSide : inputSide);  // the A curves come first
-    const uint32_t clutAt = static_cast<uint32_t>(b.size());
-    for (int k = 0; k < 16; ++k) AppendU8(b, k < lut.inputs ? static_cast<unsigned>(lut.grid) : 0);
-    AppendU8(b, 2);
-    AppendU8(b, 0);
-    AppendU16(b, 0);
-    for (uint16_t v : lut.clut) AppendU16(b, v);
-    Pad4(b);
-    const uint32_t second = curves(mba ? inputSide : outputSide);  // then the B curves
-    PutU32(b, offsets + 0, second);                                // B curves
-    PutU32(b, offsets + 12, clutAt);
-    PutU32(b, offsets + 16, first);  // A curves
+    for (const auto& curve : lut.inputCurves) values(curve);
+    values(lut.clut);
+    for (const auto& curve : lut.outputCurves) values(curve);
     return b;
 }
+inline Bytes Mft2Tag(const LutSpec& lut) { return LutTag(lut, true); }
+inline Bytes Mft1Tag(const LutSpec& lut) { return LutTag(lut, false); }
 
 inline Bytes XyzTag(double x, double y, double z) {
     Bytes b;
     AppendSig(b, "XYZ ");
-    AppendU32(b, 0);
-    AppendFixed(b, x);
-    AppendFixed(b, y);
-    AppendFixed(b, z);
-    return b;
-}
-
-inline Bytes TextTag(const std::string& text) {
-    Bytes b;
-    AppendSig(b, "text");
-    AppendU32(b, 0);
-    b.insert(b.end(), text.begin(), text.end());
-    b.push_back(0);
+    for (uint32_t v : {0u, Fixed16(x), Fixed16(y), Fixed16(z)}) Append(b, v, 4);
     return b;
 }
 
@@ -226,63 +116,41 @@ inline Bytes TextTag(const std::string& text) {
 class IccBuilder {
 public:
     // Data colour space and PCS as four characters ("CMYK", "RGB ", "Lab ", "XYZ ").
-    explicit IccBuilder(const char* colourSpace = "CMYK", const char* pcs = "Lab ", const char* deviceClass = "prtr",
-                        uint32_t version = 0x02100000)
-        : colourSpace_(colourSpace), pcs_(pcs), deviceClass_(deviceClass), version_(version) {}
+    explicit IccBuilder(const char* colourSpace = "CMYK", const char* pcs = "Lab ", const char* deviceClass = "prtr")
+        : colourSpace_(colourSpace), pcs_(pcs), deviceClass_(deviceClass) {}
 
     // The header illuminant (default D50 as 0.9642, 1.0, 0.8249).
     IccBuilder& Illuminant(double x, double y, double z) {
-        illuminant_[0] = x;
-        illuminant_[1] = y;
-        illuminant_[2] = z;
+        illuminant_ = {x, y, z};
         return *this;
     }
     IccBuilder& AddTag(const std::string& signature, Bytes data) {
         tags_.emplace_back(signature, std::move(data));
         return *this;
     }
-    // A tag that shares the data of an earlier one (as real profiles share TRCs).
-    IccBuilder& ShareTag(const std::string& signature, const std::string& sameAs) {
-        shared_.emplace_back(signature, sameAs);
-        return *this;
-    }
 
     Bytes Build() const {
-        const size_t count = tags_.size() + shared_.size();
         Bytes b(128, 0);
-        AppendU32(b, static_cast<uint32_t>(count));
-        std::vector<std::pair<uint32_t, uint32_t>> placed;  // offset, size
-        size_t at = 132 + 12 * count;
+        Append(b, static_cast<uint32_t>(tags_.size()), 4);
+        size_t at = 132 + 12 * tags_.size();
         for (const auto& tag : tags_) {
-            placed.emplace_back(static_cast<uint32_t>(at), static_cast<uint32_t>(tag.second.size()));
+            AppendSig(b, tag.first.c_str());
+            Append(b, static_cast<uint32_t>(at), 4);
+            Append(b, static_cast<uint32_t>(tag.second.size()), 4);
             at += (tag.second.size() + 3) / 4 * 4;
         }
-        auto record = [&b](const std::string& sig, uint32_t offset, uint32_t size) {
-            AppendSig(b, sig.c_str());
-            AppendU32(b, offset);
-            AppendU32(b, size);
-        };
-        for (size_t i = 0; i < tags_.size(); ++i) record(tags_[i].first, placed[i].first, placed[i].second);
-        for (const auto& share : shared_)
-            for (size_t i = 0; i < tags_.size(); ++i)
-                if (tags_[i].first == share.second) {
-                    record(share.first, placed[i].first, placed[i].second);
-                    break;
-                }
         for (const auto& tag : tags_) {
             b.insert(b.end(), tag.second.begin(), tag.second.end());
-            Pad4(b);
+            b.resize((b.size() + 3) / 4 * 4, 0);
         }
-        PutU32(b, 0, static_cast<uint32_t>(b.size()));
-        for (int k = 0; k < 4; ++k) {
-            b[4 + k] = "test"[k];
-            b[12 + k] = static_cast<uint8_t>(deviceClass_[k]);
-            b[16 + k] = static_cast<uint8_t>(colourSpace_[k]);
-            b[20 + k] = static_cast<uint8_t>(pcs_[k]);
-            b[36 + k] = "acsp"[k];
-        }
-        PutU32(b, 8, version_);
-        for (int k = 0; k < 3; ++k) PutU32(b, 68 + 4 * static_cast<size_t>(k), Fixed16(illuminant_[k]));
+        Put(b, 0, static_cast<uint32_t>(b.size()), 4);
+        Put(b, 8, 0x02100000, 4);
+        std::copy_n("test", 4, b.begin() + 4);
+        std::copy_n(deviceClass_, 4, b.begin() + 12);
+        std::copy_n(colourSpace_, 4, b.begin() + 16);
+        std::copy_n(pcs_, 4, b.begin() + 20);
+        std::copy_n("acsp", 4, b.begin() + 36);
+        for (size_t k = 0; k < 3; ++k) Put(b, 68 + 4 * k, Fixed16(illuminant_[k]), 4);
         return b;
     }
 
@@ -290,10 +158,8 @@ private:
     const char* colourSpace_;
     const char* pcs_;
     const char* deviceClass_;
-    uint32_t version_;
-    double illuminant_[3] = {0.9642, 1.0, 0.8249};
+    std::array<double, 3> illuminant_ = {0.9642, 1.0, 0.8249};
     std::vector<std::pair<std::string, Bytes>> tags_;
-    std::vector<std::pair<std::string, std::string>> shared_;
 };
 
 // Writes the bytes to `path` and returns the path.
