@@ -43,6 +43,19 @@ double StepOfPass(int pass) {
 
 void Copy(const double* from, double* to) { std::copy(from, from + kChannels, to); }
 
+// After a search from `cur` that reached `best` with `found`: the better of the two becomes both
+// the candidate and the current values, its error both `err` and `best`.
+void KeepBetter(const double* found, double* cand, double* cur, double& err, double& best) {
+    if (err <= best) {
+        best = err;
+        Copy(cur, cand);
+    } else {
+        err = best;
+        Copy(found, cand);
+        Copy(found, cur);
+    }
+}
+
 }  // namespace
 
 void Analyse1Search(CProfil& profile, const double* target, const double* start, double& deltaE,
@@ -64,14 +77,7 @@ void Analyse1Search(CProfil& profile, const double* target, const double* start,
         if (pass * 0.15 < best || pass < n) {
             ConstrainedGridSearch(profile, target, cand, 0, 255, best, StepOfPass(pass), pass, free, lightnessRule,
                                   found);
-            Copy(found, cand);
-            if (err <= best) {
-                best = err;
-                Copy(cur, cand);
-            } else {
-                err = best;
-                Copy(cand, cur);
-            }
+            KeepBetter(found, cand, cur, err, best);
             if (pass * 0.2 < best) {
                 n = 0;
                 for (int c = 0; c < kChannels; ++c) {
@@ -80,13 +86,7 @@ void Analyse1Search(CProfil& profile, const double* target, const double* start,
                 }
                 if (n <= pass) {
                     ConstrainedDescent(profile, target, cand, best, pass, free, lightnessRule, found);
-                    Copy(found, cand);
-                    if (err <= best) {
-                        Copy(cur, cand);
-                    } else {
-                        err = best;
-                        Copy(cand, cur);
-                    }
+                    KeepBetter(found, cand, cur, err, best);
                 }
             }
         }

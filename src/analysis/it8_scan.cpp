@@ -33,21 +33,13 @@ bool MatchesTarget(const Measured_IT8& it8, const It8Kind& kind, int patch, cons
 }
 
 bool IsWhite(const Measured_IT8& it8, const It8Kind& kind, int patch) {
-    switch (kind.device) {
-        case It8Kind::kMultiChannel:
-            for (int c = 0; c < 6; ++c)
-                if (it8.GetChannel(patch, c) != 0.0) return false;
-            return !kind.seventhChannel || it8.GetChannel(patch, 6) == 0.0;
-        case It8Kind::kRgb:
-            return it8.GetRgb(patch, 0) == 255.0 && it8.GetRgb(patch, 1) == 255.0 && it8.GetRgb(patch, 2) == 255.0;
-        case It8Kind::kCmyk:
-            // Paper carries no ink; a trace of black below 1 % still counts as paper.
-            return it8.GetCmyk(patch, 0) == 0.0 && it8.GetCmyk(patch, 1) == 0.0 && it8.GetCmyk(patch, 2) == 0.0 &&
-                   it8.GetCmyk(patch, 3) < 1.0;
-        case It8Kind::kNoDevice:
-            break;
-    }
-    return false;
+    static constexpr double kNoInk[7] = {0, 0, 0, 0, 0, 0, 0};
+    static constexpr double kFullRgb[7] = {255, 255, 255, 0, 0, 0, 0};
+    // Paper carries no ink; a trace of black below 1 % still counts as paper.
+    if (kind.device == It8Kind::kCmyk)
+        return it8.GetCmyk(patch, 0) == 0.0 && it8.GetCmyk(patch, 1) == 0.0 && it8.GetCmyk(patch, 2) == 0.0 &&
+               it8.GetCmyk(patch, 3) < 1.0;
+    return MatchesTarget(it8, kind, patch, kind.device == It8Kind::kRgb ? kFullRgb : kNoInk);
 }
 
 double CieCubeRoot(double r) { return r > 0.008856 ? std::pow(r, 1.0 / 3.0) : 7.787 * r + 16.0 / 116.0; }
@@ -109,9 +101,7 @@ Lab CIterativtoolDlg::MeasuredXyzToLab(double X, double Y, double Z) const {
     Y /= 100.0;
     Z /= 100.0;
     for (const CProfil* profile : {m_Outprof.get(), m_Paperprof.get(), m_Refprof.get(), m_ISDprof.get()}) {
-        if (!profile || !profile->HoldsTables()) continue;
-        const Lab lab = profile->XYZToLab(X, Y, Z);
-        return Lab{lab.L, lab.a, lab.b};
+        if (profile && profile->HoldsTables()) return profile->XYZToLab(X, Y, Z);
     }
     // No profile loaded: D50 and the plain CIE formula.
     const double fx = CieCubeRoot(X / 0.9642);

@@ -1,8 +1,9 @@
 #include "interface/parameter_file.h"
 
-#include <climits>
 #include <cmath>
 #include <cstdio>
+
+#include "it8/cgats_number.h"
 
 namespace vantrel {
 namespace {
@@ -14,10 +15,7 @@ bool ParseValue(const char* line, int& value) {
     if (line[0] == '#' || line[0] == '\r' || line[0] == '\n' || line[0] == '\0') return false;
     double number = 0;
     if (std::sscanf(line, "%lf", &number) != 1 || std::isnan(number)) return false;
-    // Truncation toward zero; numbers beyond the int range keep its ends.
-    if (number >= static_cast<double>(INT_MAX)) value = INT_MAX;
-    else if (number <= static_cast<double>(INT_MIN)) value = INT_MIN;
-    else value = static_cast<int>(number);
+    value = TruncatedInt(number);
     return true;
 }
 

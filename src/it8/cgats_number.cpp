@@ -1,6 +1,7 @@
 #include "it8/cgats_number.h"
 
 #include <charconv>
+#include <cmath>
 #include <cstddef>
 #include <limits>
 
@@ -14,42 +15,17 @@ std::size_t SkipDigits(std::string_view text, std::size_t i) {
     return i;
 }
 
-// The power of ten of a number's first significant digit; only its sign matters to the caller,
-// which meets numbers too large or too small for a double.
-int64_t DecimalExponent(std::string_view number) {
-    int64_t position = 0;  // power of ten of the digit being looked at, relative to the point
-    std::size_t i = 0;
-    std::size_t integerDigits = 0;
-    while (i < number.size() && IsDigit(number[i])) ++integerDigits, ++i;
-    int64_t first = 0;
-    bool found = false;
-    for (std::size_t k = 0; k < integerDigits; ++k) {
-        if (number[k] != '0') {
-            first = static_cast<int64_t>(integerDigits - k) - 1;
-            found = true;
-            break;
-        }
-    }
-    if (i < number.size() && number[i] == '.') {
-        ++i;
-        for (position = -1; i < number.size() && IsDigit(number[i]); ++i, --position) {
-            if (!found && number[i] != '0') {
-                first = position;
-                found = true;
-            }
-        }
-    }
-    if (!found) return 0;
-    int64_t exponent = 0;
-    if (i < number.size() && (number[i] == 'E' || number[i] == 'e')) {
-        ++i;
-        bool negative = false;
-        if (i < number.size() && (number[i] == '+' || number[i] == '-')) negative = number[i++] == '-';
-        for (; i < number.size() && IsDigit(number[i]); ++i)
-            if (exponent < 1000000000) exponent = exponent * 10 + (number[i] - '0');
-        if (negative) exponent = -exponent;
-    }
-    return first + exponent;
+// Whether a number from_chars finds out of range is too large rather than too small: its first
+// significant digit, moved by the exponent, stands at a positive power of ten.
+bool TooLarge(std::string_view number) {
+    const std::size_t integerEnd = SkipDigits(number, 0);
+    const std::size_t mantissaEnd =
+        integerEnd < number.size() && number[integerEnd] == '.' ? SkipDigits(number, integerEnd + 1) : integerEnd;
+    const std::size_t first = number.substr(0, mantissaEnd).find_first_of("123456789");
+    if (first == std::string_view::npos) return false;
+    const int64_t power = static_cast<int64_t>(integerEnd) - static_cast<int64_t>(first) - (first < integerEnd ? 1 : 0);
+    const int64_t exponent = mantissaEnd < number.size() ? LeadingInt(number.substr(mantissaEnd + 1)) : 0;
+    return power + exponent > 0;
 }
 
 }  // namespace
@@ -76,7 +52,7 @@ double LeadingDouble(std::string_view text) {
     double value = 0.0;
     const std::errc ec = std::from_chars(text.data() + start, text.data() + end, value).ec;
     if (ec == std::errc::result_out_of_range) {
-        value = DecimalExponent(text.substr(start, end - start)) > 0 ? std::numeric_limits<double>::max() : 0.0;
+        value = TooLarge(text.substr(start, end - start)) ? std::numeric_limits<double>::max() : 0.0;
     } else if (ec != std::errc()) {
         return 0.0;
     }
@@ -96,6 +72,13 @@ int32_t LeadingInt(std::string_view text) {
     if (negative) value = -value;
     if (value > std::numeric_limits<int32_t>::max()) value = std::numeric_limits<int32_t>::max();
     return static_cast<int32_t>(value);
+}
+
+int TruncatedInt(double value) {
+    if (std::isnan(value)) return 0;
+    if (value >= static_cast<double>(std::numeric_limits<int>::max())) return std::numeric_limits<int>::max();
+    if (value <= static_cast<double>(std::numeric_limits<int>::min())) return std::numeric_limits<int>::min();
+    return static_cast<int>(value);
 }
 
 }  // namespace vantrel

@@ -1,11 +1,10 @@
 // Writes measurement files in the four fixed layouts.
 #include "it8/cgats_writer.h"
 
-#include <cmath>
 #include <fstream>
 #include <iomanip>
-#include <limits>
 
+#include "it8/cgats_number.h"
 #include "it8/color_ctrl_errors.h"
 #include "it8/measured_it8.h"
 #include "it8/number_locale.h"
@@ -39,46 +38,29 @@ Layout LayoutFor(uint32_t kind) {
     }
 }
 
-// Truncation toward zero that keeps the int range's ends instead of overflowing.
-int TruncatedInt(double value) {
-    if (std::isnan(value)) return 0;
-    if (value >= static_cast<double>(std::numeric_limits<int>::max())) return std::numeric_limits<int>::max();
-    if (value <= static_cast<double>(std::numeric_limits<int>::min())) return std::numeric_limits<int>::min();
-    return static_cast<int>(value);
-}
-
 void WriteColour(std::ostream& out, const PatchRecord& record) {
     for (double v : record.lab) out << '\t' << v;
     for (double v : record.xyz) out << '\t' << v;
 }
 
 void WriteRow(std::ostream& out, uint32_t layoutKind, const PatchRecord& record, bool percentRgb) {
-    switch (layoutKind) {
-        case 3:
-            out << record.sampleNumber;
-            for (int c = 0; c < 3; ++c) {
-                // Percentages, inverted onto 0..255 (100 % is 0).
-                if (percentRgb)
-                    out << '\t' << 255 - TruncatedInt(record.device[c] * 2.55);
-                else
-                    out << '\t' << record.device[c];
-            }
-            WriteColour(out, record);
-            break;
-        case 7:
-        case 6:
-            out << record.sampleNumber;
-            for (uint32_t c = 0; c < layoutKind; ++c) out << '\t' << record.device[c];
-            WriteColour(out, record);
-            break;
-        default:
-            out << std::setw(3) << record.sampleNumber << std::fixed << std::setprecision(2);
-            for (int c = 0; c < 4; ++c) out << '\t' << record.device[c];
-            out << std::setprecision(4);
-            WriteColour(out, record);
-            out << std::defaultfloat << std::setprecision(6);
-            break;
+    if (layoutKind == 4) {
+        out << std::setw(3) << record.sampleNumber << std::fixed << std::setprecision(2);
+        for (int c = 0; c < 4; ++c) out << '\t' << record.device[c];
+        out << std::setprecision(4);
+        WriteColour(out, record);
+        out << std::defaultfloat << std::setprecision(6) << '\n';
+        return;
     }
+    out << record.sampleNumber;
+    for (uint32_t c = 0; c < layoutKind; ++c) {
+        // RGB percentages, inverted onto 0..255 (100 % is 0).
+        if (layoutKind == 3 && percentRgb)
+            out << '\t' << 255 - TruncatedInt(record.device[c] * 2.55);
+        else
+            out << '\t' << record.device[c];
+    }
+    WriteColour(out, record);
     out << '\n';
 }
 

@@ -55,29 +55,28 @@ bool SuffixWavelength(const std::string& name, std::size_t prefixLength, int32_t
 }  // namespace
 
 void Measured_IT8::Reset() {
+    ClearFormat();
+    m_FieldNames.clear();
+    m_SpotColours.clear();
+    m_Rows.clear();
+    m_TargetId.clear();
+    m_Target.clear();
+    m_LayoutId.clear();
+    m_Header = It8Header{};
+}
+
+void Measured_IT8::ClearFormat() {
     m_Columns.fill(-1);
     m_Fields.clear();
     m_SpectralFields.clear();
     m_FieldMap.clear();
     m_Wavelengths.clear();
-    m_SpotColours.clear();
-    m_Rows.clear();
     m_SpectralScale = 1.0;
-    m_TargetId.clear();
-    m_Target.clear();
-    m_LayoutId.clear();
-    m_FieldNames.clear();
-    m_Header = It8Header{};
 }
 
 void Measured_IT8::TakeFieldNames(const std::vector<std::string>& names) {
     // A second data format replaces the first, so the rows always match the names.
-    m_Columns.fill(-1);
-    m_Fields.clear();
-    m_SpectralFields.clear();
-    m_FieldMap.clear();
-    m_Wavelengths.clear();
-    m_SpectralScale = 1.0;
+    ClearFormat();
     m_FieldNames = names;
     m_Header.fieldNameCount = static_cast<int32_t>(names.size());
     for (std::size_t i = 0; i < names.size(); ++i) TakeColumn(static_cast<int32_t>(i), names[i]);

@@ -108,6 +108,8 @@ public:
 
 private:
     void Reset();
+    // Forgets the columns of the data format (positions, names, spectral lists).
+    void ClearFormat();
     int32_t ReadOpened(std::istream& in);
     // Takes the names of the data-format line: field list, name map, column positions, spectral lists.
     void TakeFieldNames(const std::vector<std::string>& names);
