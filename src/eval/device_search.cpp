@@ -144,7 +144,7 @@ void ConstrainedGridSearch(CProfil& p, const double* target, const double* start
         const bool multi = inputs >= 5;
         double lows[kChannels] = {0, 0, 0, blackLow, 0, 0, 0};
         double highs[kChannels];
-        for (int c = 0; c < kChannels; ++c) highs[c] = (flags[c] ? 1.0 : 0.0) * 255.0;
+        for (int c = 0; c < kChannels; ++c) highs[c] = flags[c] ? 255.0 : 0.0;
         highs[kBlack] = (flags[kBlack] ? 1.0 : 0.0) * blackHigh;
         GridWalk walk(forward, rule, highs, lows, multi ? kChannels : 4, limit, multi, step, best);
         walk.Walk(0, 0);
@@ -169,22 +169,13 @@ struct Descent {
         return count;
     }
 
-    void Up(int c, double step, double high) {
-        while (flags[c] && v[c] < high) {
+    // Channel c walks by `step` while it lies below `bound` (upwards) or above it (downwards); an
+    // upward step that brings one channel too many into use fails like a refused one.
+    void Walk(int c, double step, double bound, bool darkExempt = true) {
+        while (flags[c] && (step > 0.0 ? v[c] < bound : v[c] > bound)) {
             const double keep = v[c];
             v[c] = keep + step;
-            if (InUse() > limit || !Try()) {
-                v[c] = keep;
-                return;
-            }
-        }
-    }
-
-    void Down(int c, double step, double low, bool darkExempt = true) {
-        while (flags[c] && v[c] > low) {
-            const double keep = v[c];
-            v[c] = keep - step;
-            if (!Try(darkExempt)) {
+            if ((step > 0.0 && InUse() > limit) || !Try(darkExempt)) {
                 v[c] = keep;
                 return;
             }
@@ -210,23 +201,18 @@ void ConstrainedDescent(CProfil& p, const double* target, const double* start, d
     for (int c = 0; c < kChannels; ++c) best[c] = start[c];
     Descent d{forward, rule, best, flags, limit};
 
-    struct Phase {
-        double step, high, low, enough;
-        bool strictBlackDown;
-    };
-    const Phase phases[2] = {{1.0, 254.0, 1.0, 0.2, true}, {0.1, 254.9, 0.1, 0.1, false}};
-    for (const Phase& ph : phases) {
+    // Channels 0..2, then 4..6 where the profile has them, in the order the blocks take them.
+    const int chromatic[6] = {0, 1, 2, 4, 5, 6};
+    const int count = multi ? 6 : 3;
+    for (const DescentPhase& ph : kDescentPhases) {
+        // In the first phase the lightness rule holds for dark starts too while black comes down.
+        const bool darkExempt = &ph != &kDescentPhases[0];
         for (;;) {
             const double roundStart = rule.best;
-            // In the first phase the lightness rule holds for dark starts too while black comes down.
-            d.Down(kBlack, ph.step, ph.low, !ph.strictBlackDown);
-            for (int c = 0; c < 3; ++c) d.Up(c, ph.step, ph.high);
-            if (multi)
-                for (int c = 4; c < kChannels; ++c) d.Up(c, ph.step, ph.high);
-            d.Up(kBlack, ph.step, ph.high);
-            for (int c = 0; c < 3; ++c) d.Down(c, ph.step, ph.low);
-            if (multi)
-                for (int c = 4; c < kChannels; ++c) d.Down(c, ph.step, ph.low);
+            d.Walk(kBlack, -ph.step, ph.low, darkExempt);
+            for (int k = 0; k < count; ++k) d.Walk(chromatic[k], ph.step, ph.high);
+            d.Walk(kBlack, ph.step, ph.high);
+            for (int k = 0; k < count; ++k) d.Walk(chromatic[k], -ph.step, ph.low);
             if (!(rule.best < roundStart && rule.best > ph.enough)) break;
         }
     }
@@ -250,16 +236,9 @@ void RangedDescent(CProfil& p, const double* target, const double* start, double
             best[c] = keep;
         }
     };
-    auto movable = [&](int c) {
-        const double f = flags[c] ? 1.0 : 0.0;
-        return flags[c] && best[c] > f * low && best[c] < f * high;
-    };
+    auto movable = [&](int c) { return flags[c] && best[c] > low && best[c] < high; };
 
-    struct Phase {
-        double step, high, low, enough;
-    };
-    const Phase phases[2] = {{1.0, 254.0, 1.0, 0.2}, {0.1, 254.9, 0.1, 0.1}};
-    for (const Phase& ph : phases) {
+    for (const DescentPhase& ph : kDescentPhases) {
         for (;;) {
             const double roundStart = bestDelta;
             for (int c = 0; c < 4; ++c)

@@ -14,6 +14,14 @@ class CProfil;
 // the target, unless it is not darker than the last accepted colour and the target is not
 // darker than that either) and stays closer to the start colour than the start's own error.
 
+// The two phases of the coordinate descents here and of the inverse search: the step, the bounds
+// a channel must be below (to step up) or above (to step down), and the difference a round must
+// stay above for another round to start.
+struct DescentPhase {
+    double step, high, low, enough;
+};
+constexpr DescentPhase kDescentPhases[2] = {{1.0, 254.0, 1.0, 0.2}, {0.1, 254.9, 0.1, 0.1}};
+
 // Every lattice point of step `step`: channels 0..2 (and 4..6) from 0 up to 255 where their
 // flag is set, black from blackLow up to blackHigh (flag 3 set); at most `limit` channels in
 // use (value > 0) at once; for five or more colourants, pairs and triples of chromatic

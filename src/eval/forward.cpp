@@ -37,17 +37,14 @@ int CmykToLab(CProfil& p, double* v) {
     e[2] = v[2];
     e[3] = v[3];
     InterpolateSimplex(p, 0);
-    ScaleTableOutputs(p, 0, 3);
-    DecodeDirection0(p, e, v);
+    DecodeDirection0(p, v);
     return 1;
 }
 
 int MultiToLab(CProfil& p, double* v) {
-    double* e = p.m_Eval;
-    for (int k = 0; k < CProfil::kEvalSize; ++k) e[k] = v[k];
+    for (int k = 0; k < CProfil::kEvalSize; ++k) p.m_Eval[k] = v[k];
     InterpolateMultilinear(p, 0);
-    ScaleTableOutputs(p, 0, 3);
-    DecodeDirection0(p, e, v);
+    DecodeDirection0(p, v);
     return 1;
 }
 
@@ -56,25 +53,15 @@ int RgbToLab(CProfil& p, double* v) {
     e[0] = v[0];
     e[1] = v[1];
     e[2] = v[2];
-    const LutSlot& lut = p.m_Lut[0];
-    const bool matrix = IsMatrixTrc(lut);
-    if (matrix) {
-        MatrixTrcForward(p);
-    } else {
+    if (!IsMatrixTrc(p.m_Lut[0])) {
         InterpolateSimplex(p, 0);
+        DecodeDirection0(p, v);
+        return 1;
     }
+    MatrixTrcForward(p);
     ScaleTableOutputs(p, 0, 3);
-    if (matrix) {
-        // The matrix path hands over 8-bit table Lab, whatever the slot's PCS name says.
-        Lab lab{e[0] / kLightnessScale, e[1] - 128.0, e[2] - 128.0};
-        if (p.m_UseMediaWhite[0]) lab = p.LabToAbsolute(lab.L, lab.a, lab.b, 0);
-        const double scaled = lab.L * kLightnessScale;
-        v[0] = scaled > 255.0 ? 255.0 : scaled;
-        v[1] = lab.a;
-        v[2] = lab.b;
-    } else {
-        DecodeDirection0(p, e, v);
-    }
+    // The matrix path hands over 8-bit table Lab, whatever the slot's PCS name says.
+    StoreScaledLab(LabOfTableLab(p, 0, p.m_Eval, 128.0), v);
     return 1;
 }
 
@@ -102,23 +89,18 @@ int LabThroughTable(CProfil& p, double* v, int slot) {
     if (slot == 1) {
         EncodeForDirection1(p, v, true);
         InterpolateSimplex(p, 1);
-        double half = 128.0;
-        if (p.m_Precision[1] != 0) {
-            ScaleTableOutputs(p, 1, 3);
-            half = 127.5;
-        }
+        ScaleTableOutputs(p, 1, 3);
+        const double half = p.m_Precision[1] != 0 ? 127.5 : 128.0;
         v[0] = e[0] > 255.0 ? 255.0 : e[0];
         v[1] = e[1] - half;
         v[2] = e[2] - half;
         return 1;
     }
-    const double half = p.m_Precision[0] >= 1 ? 127.5 : 128.0;
     e[0] = v[0];
-    e[1] = v[1] + half;
-    e[2] = v[2] + half;
+    e[1] = v[1] + LabHalf(p, 0);
+    e[2] = v[2] + LabHalf(p, 0);
     InterpolateSimplex(p, 0);
-    ScaleTableOutputs(p, 0, 3);
-    DecodeDirection0(p, e, v);
+    DecodeDirection0(p, v);
     return 1;
 }
 

@@ -50,13 +50,13 @@ public:
 
     GamutRecord Build() {
         if (channels_ == 3) {
-            LabLattice();
-            DeviceLattice();
+            Lattice(false);
+            Lattice(true);
             RgbSweeps();
         } else {
             Direction0Nodes();
             Direction1Nodes();
-            LabLattice();
+            Lattice(false);
             HueSweeps();
         }
         EdgeSearch();
@@ -123,22 +123,15 @@ private:
         }
     }
 
-    void LabLattice() {
+    // The 21 x 21 x 21 lattice of step 12.75: Lab (a*, b* from -128), or RGB device values
+    // taken forward first.
+    void Lattice(bool device) {
+        const double ab = device ? 0.0 : -128.0;
         for (int i = 0; i <= 20; ++i)
             for (int j = 0; j <= 20; ++j)
                 for (int k = 0; k <= 20; ++k) {
-                    double v[CProfil::kEvalSize] = {12.75 * i, 12.75 * j - 128.0, 12.75 * k - 128.0};
-                    RoundTrip(v);
-                    Record(v);
-                }
-    }
-
-    void DeviceLattice() {
-        for (int i = 0; i <= 20; ++i)
-            for (int j = 0; j <= 20; ++j)
-                for (int k = 0; k <= 20; ++k) {
-                    double v[CProfil::kEvalSize] = {12.75 * i, 12.75 * j, 12.75 * k};
-                    RgbToLab(p_, v);
+                    double v[CProfil::kEvalSize] = {12.75 * i, 12.75 * j + ab, 12.75 * k + ab};
+                    if (device) RgbToLab(p_, v);
                     RoundTrip(v);
                     Record(v);
                 }

@@ -22,15 +22,9 @@ bool RecordInputs(CProfil& p, double* record, int slot, const LutView& t, double
         return false;
     }
     if (t.inputs >= 4) {
-        for (int i = 0; i < 7; ++i) inputs[i] = 0.0;
-        for (int i = 0; i < 4; ++i) inputs[i] = record[i];
-        for (int i = 4; i < t.inputs; ++i) inputs[i] = record[i];
+        for (int i = 0; i < t.inputs; ++i) inputs[i] = record[i];
     } else {
-        double lab[3] = {record[0], record[1], record[2]};
-        lab[0] = Clamp(lab[0], 0.0, 255.0);
-        lab[1] = Clamp(lab[1], -128.0, 127.0);
-        lab[2] = Clamp(lab[2], -128.0, 127.0);
-        EncodeForNode(p, slot, lab, -128.0, inputs);
+        EncodePcs(p, slot, record, -128.0, inputs);
         record[3] = 0.0;
     }
     for (int i = 0; i < t.inputs; ++i)

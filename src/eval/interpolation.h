@@ -5,7 +5,6 @@
 namespace vantrel {
 
 class CProfil;
-struct LutSlot;
 
 // The interpolation kernels. Both take the inputs (0..255) from the evaluation vector and leave
 // the slot's outputs in its first m entries, in table units (0..255 for 8-bit tables, 0..65535
@@ -24,11 +23,9 @@ void InterpolateMultilinear(CProfil& profile, int slot);
 // Runs the kernel a slot's table calls for: multilinear for tables of five to seven
 // colourants (and any table of more than four inputs), simplex otherwise.
 void InterpolateSlot(CProfil& profile, int slot);
-bool UsesMultilinearKernel(const LutSlot& lut);
 
 // The view of slot 0 or 1 of a profile. A slot whose tables are missing or smaller than its
 // descriptor says gives a view of no inputs, which every kernel leaves alone.
 LutView SlotView(const CProfil& profile, int slot);
-KernelScratch ProfileScratch(CProfil& profile);
 
 }  // namespace vantrel

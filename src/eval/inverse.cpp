@@ -1,5 +1,7 @@
 #include "eval/inverse.h"
 
+#include <algorithm>
+
 #include "colour/colour_math.h"
 #include "eval/device_search.h"
 #include "eval/forward.h"
@@ -31,6 +33,38 @@ void CopyCapped(const double* from, double* to, int count) {
     for (int k = 0; k < count; ++k) to[k] = from[k] > 255.0 ? 255.0 : from[k];
 }
 
+// The difference between the target and the forward evaluation of w (20 values).
+double DeltaTo(CProfil& p, const double* target, const double* w, int channels) {
+    double lab[CProfil::kEvalSize];
+    for (int k = 0; k < CProfil::kEvalSize; ++k) lab[k] = w[k];
+    DeviceToLab(p, lab, channels);
+    return DeltaE(target[0], target[1], target[2], lab[0] / kLightnessScale, lab[1], lab[2]);
+}
+
+// Coordinate descent on channels 0..2, each channel walking up while below the phase's upper
+// bound and then down while above its lower one, keeping only strict improvements; rounds repeat
+// while they help and the difference stays above the phase's threshold.
+void Descend(CProfil& p, const double* target, double* w, int channels, double& best, const DescentPhase& ph) {
+    for (;;) {
+        const double roundStart = best;
+        for (const double step : {ph.step, -ph.step}) {
+            for (int c = 0; c < 3; ++c) {
+                while (step > 0.0 ? w[c] < ph.high : w[c] > ph.low) {
+                    const double keep = w[c];
+                    w[c] = keep + step;
+                    const double e = DeltaTo(p, target, w, channels);
+                    if (!(e < best)) {
+                        w[c] = keep;
+                        break;
+                    }
+                    best = e;
+                }
+            }
+        }
+        if (!(best < roundStart && best > ph.enough)) return;
+    }
+}
+
 }  // namespace
 
 int LabToCmyk(CProfil& p, double* v) {
@@ -46,9 +80,7 @@ int LabToMulti(CProfil& p, double* v) {
     InterpolateMultilinear(p, 1);
     // Only the table's outputs are device values; the entries past them are cleared so that the
     // vector can go straight back into a multi-channel forward evaluation.
-    int m = p.m_Lut[1].outputChannels;
-    if (m < 0) m = 0;
-    if (m > CProfil::kEvalSize) m = CProfil::kEvalSize;
+    const int m = std::clamp(p.m_Lut[1].outputChannels, 0, CProfil::kEvalSize);
     ScaleTableOutputs(p, 1, m);
     CopyCapped(p.m_Eval, v, m);
     for (int k = m; k < CProfil::kEvalSize; ++k) v[k] = 0.0;
@@ -77,66 +109,13 @@ void LabToDevice(CProfil& p, double* v, int channels) {
     }
 }
 
-namespace {
-
-// Coordinate descent on channels 0..2 in steps of `step`, each channel walking up while below
-// `high` and then down while above `low`, keeping only strict improvements; rounds repeat
-// while they help and the difference stays above `enough`.
-void Descend(CProfil& p, const double* target, double* w, int channels, double& best, double step, double high,
-             double low, double enough) {
-    double lab[CProfil::kEvalSize];
-    auto evaluate = [&]() {
-        for (int k = 0; k < CProfil::kEvalSize; ++k) lab[k] = w[k];
-        DeviceToLab(p, lab, channels);
-        return DeltaE(target[0], target[1], target[2], lab[0] / kLightnessScale, lab[1], lab[2]);
-    };
-    for (;;) {
-        const double roundStart = best;
-        for (int c = 0; c < 3; ++c) {
-            while (w[c] < high) {
-                const double keep = w[c];
-                w[c] = keep + step;
-                const double e = evaluate();
-                if (e < best) {
-                    best = e;
-                } else {
-                    w[c] = keep;
-                    break;
-                }
-            }
-        }
-        for (int c = 0; c < 3; ++c) {
-            while (w[c] > low) {
-                const double keep = w[c];
-                w[c] = keep - step;
-                const double e = evaluate();
-                if (e < best) {
-                    best = e;
-                } else {
-                    w[c] = keep;
-                    break;
-                }
-            }
-        }
-        if (!(best < roundStart && best > enough)) return;
-    }
-}
-
-}  // namespace
-
 double* InverseSearch(CProfil& p, double L, double a, double b, const double* start, double* result,
                       double& deltaE) {
     const double target[3] = {L, a, b};
     int channels = p.m_Lut[1].outputChannels;
     if (channels < 1) channels = 4;
     double w[CProfil::kEvalSize] = {start[0], start[1], start[2], start[3]};
-    int inUse[7] = {0, 0, 0, 1, 0, 0, 0};
-    for (int c = 0; c < 3; ++c) inUse[c] = start[c] >= 0.5;
-
-    double lab[CProfil::kEvalSize];
-    for (int k = 0; k < CProfil::kEvalSize; ++k) lab[k] = w[k];
-    DeviceToLab(p, lab, channels);
-    const double startDelta = DeltaE(L, a, b, lab[0] / kLightnessScale, lab[1], lab[2]);
+    const double startDelta = DeltaTo(p, target, w, channels);
 
     // A start this far off is replaced by scans and a coarse lattice before the descent.
     double best = startDelta;
@@ -144,29 +123,21 @@ double* InverseSearch(CProfil& p, double L, double a, double b, const double* st
         for (int c = 0; c < 3; ++c) w[c] = ScanChannel(p, target, w, c, 0.0, 255.0);
     }
     if (startDelta > 300.5) {
-        double from[7] = {w[0], w[1], w[2], w[3], 0, 0, 0};
+        const int inUse[7] = {start[0] >= 0.5, start[1] >= 0.5, start[2] >= 0.5, 1, 0, 0, 0};
+        const double from[7] = {w[0], w[1], w[2], w[3], 0, 0, 0};
         double found[7];
         double gridDelta = startDelta;
         ConstrainedGridSearch(p, target, from, start[3] - 0.5, start[3] + 0.5, gridDelta, 12.25, 3, inUse, true,
                               found);
-        for (int c = 0; c < 4; ++c) w[c] = found[c];
+        std::copy(found, found + 4, w);
     }
+    if (startDelta > 300.2) best = DeltaTo(p, target, w, channels);
+    for (const DescentPhase& ph : kDescentPhases) Descend(p, target, w, channels, best, ph);
 
-    if (startDelta > 300.2) {
-        for (int k = 0; k < CProfil::kEvalSize; ++k) lab[k] = w[k];
-        DeviceToLab(p, lab, channels);
-        best = DeltaE(L, a, b, lab[0] / kLightnessScale, lab[1], lab[2]);
-    }
-    Descend(p, target, w, channels, best, 1.0, 254.0, 1.0, 0.2);
-    Descend(p, target, w, channels, best, 0.1, 254.9, 0.1, 0.1);
-
-    if (best < startDelta) {
-        for (int c = 0; c < 4; ++c) result[c] = w[c];
-        deltaE = best;
-    } else {
-        for (int c = 0; c < 4; ++c) result[c] = start[c];
-        deltaE = startDelta;
-    }
+    const bool improved = best < startDelta;
+    const double* answer = improved ? w : start;
+    std::copy(answer, answer + 4, result);
+    deltaE = improved ? best : startDelta;
     return result;
 }
 

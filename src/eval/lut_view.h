@@ -27,6 +27,19 @@ struct LutView {
 
     // The output curves act only when they are long enough to be real curves and are not the identity.
     bool UsesOutputCurves() const { return outputEntries >= 256 && !outputIdentity; }
+
+    // Output curve j at a CLUT value, interpolated between its entries.
+    double OutputCurveAt(int j, double value) const {
+        const int first = j * outputEntries;
+        const int last = first + outputEntries - 1;
+        const double q = value * outputScale + first;
+        int k = static_cast<int>(q);
+        if (k < first) k = first;
+        if (k > last) k = last;
+        const double u = q - k;
+        if (u > 0.0 && k < last) return outputCurves[k] + (outputCurves[k + 1] - outputCurves[k]) * u;
+        return outputCurves[k];
+    }
 };
 
 // The working fields an evaluation writes: they live in the profile being evaluated.

@@ -5,23 +5,6 @@
 #include "eval/grid_coordinate.h"
 
 namespace vantrel {
-namespace {
-
-// Maps an interpolated grid value through output curve j, interpolating between entries.
-double ThroughOutputCurve(const LutView& t, int j, double sum) {
-    const int first = j * t.outputEntries;
-    const int last = first + t.outputEntries - 1;
-    const double q = sum * t.outputScale + first;
-    int k = static_cast<int>(q);
-    if (k < first) k = first;
-    if (k > last) k = last;
-    const double u = q - k;
-    const uint16_t* curve = t.outputCurves;
-    if (u > 0.0 && k < last) return curve[k] + (curve[k + 1] - curve[k]) * u;
-    return curve[k];
-}
-
-}  // namespace
 
 void InterpolateMultilinear(const LutView& t, KernelScratch& s) {
     const int n = t.inputs;
@@ -46,7 +29,7 @@ void InterpolateMultilinear(const LutView& t, KernelScratch& s) {
         for (int k = 0; k < corners; ++k) {
             if (s.weights[k] > 0.0) sum += s.weights[k] * clut[t.cornerOffsets[k]];
         }
-        s.vector[j] = curves ? ThroughOutputCurve(t, j, sum) : sum;
+        s.vector[j] = curves ? t.OutputCurveAt(j, sum) : sum;
     }
 }
 

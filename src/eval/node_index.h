@@ -15,8 +15,6 @@ inline int32_t RecordIndex(double value, int grid, bool rounded) {
     return static_cast<int32_t>(v);
 }
 
-inline int32_t RoundedIndex(double value, int grid) { return RecordIndex(value, grid, true); }
-
 // CLUT offset of the node whose n indices start at `indices`.
 inline int32_t NodeOffset(const LutView& t, const double* indices, bool rounded) {
     int32_t offset = 0;

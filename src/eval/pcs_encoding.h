@@ -37,19 +37,33 @@ inline void ScaleTableOutputs(CProfil& p, int slot, int count) {
     for (int j = 0; j < count; ++j) p.m_Eval[j] *= CProfil::kInv257;
 }
 
-// Decodes three PCS values of the direction-0 table (on 0..255) into scaled Lab in lab[0..2],
-// absolute when direction 0 uses the media white. L* x 2.55 is limited to 255 from above only.
-void DecodeDirection0(const CProfil& p, const double* table, double* lab);
+// Table values to Lab (L* unscaled), absolute when the slot's direction uses the media white:
+// XYZ with white Y = 1, or Lab in 0..255 table units with a*, b* offset by `half`.
+Lab LabOfTableXyz(const CProfil& p, int slot, XYZ xyz);
+Lab LabOfTableLab(const CProfil& p, int slot, const double* table, double half);
+// Three PCS values of a slot's table (0..255) to Lab, by the slot's PCS.
+Lab DecodePcs(const CProfil& p, int slot, const double* table);
 
-// Clamps the scaled Lab in lab[0..2] in place and puts its encoding for the direction-1 table
-// into the evaluation vector (relative to the media white when direction 1 uses it). With
-// xyzPath, an "XYZ" table gets XYZ through its matrix; without, every table gets Lab (the
-// inverse matrix/TRC path decodes Lab itself).
+// Writes scaled Lab (L* x 2.55, limited to 255 from above only; a*, b*) into lab[0..2].
+inline void StoreScaledLab(const Lab& in, double* lab) {
+    const double scaled = in.L * kLightnessScale;
+    lab[0] = scaled > 255.0 ? 255.0 : scaled;
+    lab[1] = in.a;
+    lab[2] = in.b;
+}
+
+// The direction-0 table's three outputs in the evaluation vector (table units) to scaled Lab in
+// lab[0..2].
+void DecodeDirection0(CProfil& p, double* lab);
+
+// Encodes a scaled Lab for the PCS side of slot s: clamped first (L* x 2.55 to 0..255, a*, b* to
+// aLow..127), relative when the direction uses the media white, and for an "XYZ" table through its
+// matrix unless `asLab`; 0..255 table units.
+void EncodePcs(const CProfil& p, int slot, const double* lab, double aLow, double* table, bool asLab = false);
+
+// Clamps the scaled Lab in lab[0..2] in place (a*, b* to -128..127) and puts its encoding for the
+// direction-1 table into the evaluation vector. Without xyzPath every table gets Lab (the inverse
+// matrix/TRC path decodes Lab itself).
 void EncodeForDirection1(CProfil& p, double* lab, bool xyzPath);
-
-// Encodes a scaled Lab for storing at a node of slot s (the node writers and the grid location
-// of PCS-input slots): clamped, relative when the direction uses the media white, in 0..255
-// table units. aLow is the lowest a*, b* accepted.
-void EncodeForNode(const CProfil& p, int slot, const double* lab, double aLow, double* table);
 
 }  // namespace vantrel

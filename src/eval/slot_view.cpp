@@ -5,17 +5,26 @@
 #include "icc/profil.h"
 
 namespace vantrel {
-
 namespace {
 
-// Built field by field: an evaluation makes one per call, and zeroing it first costs more than
-// filling it.
-LutView NoTable() { return LutView{}; }
+KernelScratch ProfileScratch(CProfil& p) {
+    return {p.m_Eval, p.m_WorkRecords, p.m_Complement, p.m_CornerWeights};
+}
+
+// Tables of five to seven colourants, by their input count or their data colour space.
+bool UsesMultilinearKernel(const LutSlot& lut) {
+    if (lut.inputChannels > 4) return true;
+    static const char* const kMultiSpaces[] = {"5CLR", "MCH5", "6CLR", "MCH6", "7CLR", "MCH7"};
+    if (lut.colourSpace.size() < 4) return false;
+    for (const char* space : kMultiSpaces)
+        if (std::memcmp(lut.colourSpace.data(), space, 4) == 0) return true;
+    return false;
+}
 
 }  // namespace
 
 LutView SlotView(const CProfil& p, int slot) {
-    if (slot < 0 || slot > 1) return NoTable();
+    if (slot < 0 || slot > 1) return LutView{};
     const LutSlot& lut = p.m_Lut[slot];
     const int n = lut.inputChannels;
     const int m = lut.outputChannels;
@@ -24,7 +33,7 @@ LutView SlotView(const CProfil& p, int slot) {
     const int grid = lut.gridPoints;
     if (n < 1 || n > CProfil::kMaxInputs || m < 1 || m > KernelScratch::kVectorSize || grid < 1 || entries < 1 ||
         outEntries < 1)
-        return NoTable();
+        return LutView{};
     // The tables must be as large as the descriptor says, else nothing is read from them.
     const auto& in = p.m_InputCurves[slot];
     const auto& clut = p.m_Clut[slot];
@@ -32,47 +41,20 @@ LutView SlotView(const CProfil& p, int slot) {
     const uint64_t clutValues = static_cast<uint64_t>(p.m_ClutStride[slot][0]) * static_cast<uint64_t>(grid);
     if (in.size() < static_cast<uint64_t>(n) * entries || clut.empty() || clut.size() < clutValues ||
         out.size() < static_cast<uint64_t>(m) * outEntries)
-        return NoTable();
-    LutView v;
-    v.inputs = n;
-    v.outputs = m;
-    v.inputEntries = entries;
-    v.outputEntries = outEntries;
-    v.grid = grid;
-    v.gridScale = p.m_GridScale[slot];
-    v.outputScale = p.m_OutputScale[slot];
-    v.outputIdentity = p.m_OutputIdentity[slot] != 0;
-    v.inputCurves = in.data();
-    v.clut = clut.data();
-    v.outputCurves = out.data();
-    v.clutStrides = p.m_ClutStride[slot];
-    v.cornerOffsets = p.m_CornerOffsets[slot];
-    return v;
-}
-
-KernelScratch ProfileScratch(CProfil& p) {
-    return {p.m_Eval, p.m_WorkRecords, p.m_Complement, p.m_CornerWeights};
+        return LutView{};
+    return LutView{n, m, entries, outEntries, grid, p.m_GridScale[slot], p.m_OutputScale[slot],
+                   p.m_OutputIdentity[slot] != 0, in.data(), clut.data(), out.data(), p.m_ClutStride[slot],
+                   p.m_CornerOffsets[slot]};
 }
 
 void InterpolateSimplex(CProfil& p, int slot) {
-    const LutView view = SlotView(p, slot);
     KernelScratch scratch = ProfileScratch(p);
-    InterpolateSimplex(view, scratch);
+    InterpolateSimplex(SlotView(p, slot), scratch);
 }
 
 void InterpolateMultilinear(CProfil& p, int slot) {
-    const LutView view = SlotView(p, slot);
     KernelScratch scratch = ProfileScratch(p);
-    InterpolateMultilinear(view, scratch);
-}
-
-bool UsesMultilinearKernel(const LutSlot& lut) {
-    if (lut.inputChannels > 4) return true;
-    static const char* const kMultiSpaces[] = {"5CLR", "MCH5", "6CLR", "MCH6", "7CLR", "MCH7"};
-    if (lut.colourSpace.size() < 4) return false;
-    for (const char* space : kMultiSpaces)
-        if (std::memcmp(lut.colourSpace.data(), space, 4) == 0) return true;
-    return false;
+    InterpolateMultilinear(SlotView(p, slot), scratch);
 }
 
 void InterpolateSlot(CProfil& p, int slot) {

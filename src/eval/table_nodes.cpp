@@ -17,20 +17,6 @@ constexpr int kFirstIndexField = 4;
 // NodePcsValue tries input values 0, 0.1, .. 254.9.
 constexpr int kCandidates = 2550;
 
-// Output curve j of a slot at a CLUT value, interpolated between entries.
-double OutputCurveAt(const LutView& t, int j, double value) {
-    const int first = j * t.outputEntries;
-    const int last = first + t.outputEntries - 1;
-    const double q = value * t.outputScale + first;
-    int k = static_cast<int>(q);
-    if (k < first) k = first;
-    if (k > last) k = last;
-    const double u = q - k;
-    const uint16_t* c = t.outputCurves;
-    if (u > 0.0 && k < last) return c[k] + (c[k + 1] - c[k]) * u;
-    return c[k];
-}
-
 // The input value x (a multiple of 0.1) whose grid coordinate lies closest to `index` among
 // those that round to it; the first such on ties.
 double InputForNode(const LutView& t, int channel, int index) {
@@ -92,25 +78,22 @@ void SolveMatrix(const double (&m)[3][3], const double* y, double* x) {
     x[2] = det3(m[0][0], m[0][1], y[0], m[1][0], m[1][1], y[1], m[2][0], m[2][1], y[2]) / det;
 }
 
-// Decodes three PCS values of slot s (0..255) into scaled Lab, absolute when the direction
-// uses the media white; L* x 2.55 unclamped.
-void DecodeNodePcs(const CProfil& p, int slot, const double* t, double* lab) {
-    Lab out;
-    if (IsXyzPcs(p.m_Lut[slot])) {
-        XYZ xyz{t[0] / kXyzToTable, t[1] / kXyzToTable, t[2] / kXyzToTable};
-        if (p.m_UseMediaWhite[slot]) xyz = p.AdaptToAbsolute(xyz.X, xyz.Y, xyz.Z, slot);
-        out = p.XYZToLab(xyz.X, xyz.Y, xyz.Z);
-    } else {
-        const double half = LabHalf(p, slot);
-        out = Lab{t[0] / kLightnessScale, t[1] - half, t[2] - half};
-        if (p.m_UseMediaWhite[slot]) out = p.LabToAbsolute(out.L, out.a, out.b, slot);
-    }
-    lab[0] = out.L * kLightnessScale;
-    lab[1] = out.a;
-    lab[2] = out.b;
+bool SixteenBit(const CProfil& p, int slot) { return p.m_Precision[slot] != 0; }
+
+// Scaled Lab into record fields 0..2, L* x 2.55 unclamped.
+void PutLab(const Lab& lab, double* record) {
+    record[0] = lab.L * kLightnessScale;
+    record[1] = lab.a;
+    record[2] = lab.b;
 }
 
-bool SixteenBit(const CProfil& p, int slot) { return p.m_Precision[slot] != 0; }
+// Output j of the node at `node`: the CLUT value, through the output curve when `curves`, on
+// 0..255.
+double NodeOutput(const CProfil& p, const LutView& t, int slot, int32_t node, int j, bool curves) {
+    double v = t.clut[node + j];
+    if (curves) v = t.OutputCurveAt(j, v);
+    return SixteenBit(p, slot) ? v * CProfil::kInv257 : v;
+}
 
 uint16_t Store(double value, double bound) {
     if (!(value > 0.0)) return 0;
@@ -129,7 +112,7 @@ void NodePcsValue(CProfil& p, double* record) {
     double x[4] = {0, 0, 0, 0};
     const int channels = t.inputs < 4 ? t.inputs : 4;
     for (int c = 0; c < channels; ++c) {
-        const int wanted = RoundedIndex(record[c], t.grid);
+        const int wanted = RecordIndex(record[c], t.grid, true);
         x[c] = InputForNode(t, c, wanted);
     }
     if (t.inputs >= 4) {
@@ -137,35 +120,25 @@ void NodePcsValue(CProfil& p, double* record) {
         return;
     }
     const LutSlot& lut = p.m_Lut[1];
-    Lab lab;
     if (IsXyzPcs(lut)) {
+        // Table units back to XYZ on the 0..100 scale, through the inverse of the table's matrix.
         const double y[3] = {x[0] * 257.0 / 327.68, x[1] * 257.0 / 327.68, x[2] * 257.0 / 327.68};
         double xyz[3];
         SolveMatrix(lut.matrix, y, xyz);
-        XYZ v{xyz[0] / 100.0, xyz[1] / 100.0, xyz[2] / 100.0};
-        if (p.m_UseMediaWhite[1]) v = p.AdaptToAbsolute(v.X, v.Y, v.Z, 1);
-        lab = p.XYZToLab(v.X, v.Y, v.Z);
+        PutLab(LabOfTableXyz(p, 1, XYZ{xyz[0] / 100.0, xyz[1] / 100.0, xyz[2] / 100.0}), record);
     } else {
-        const double half = LabHalf(p, 1);
-        lab = Lab{x[0] / kLightnessScale, x[1] - half, x[2] - half};
-        if (p.m_UseMediaWhite[1]) lab = p.LabToAbsolute(lab.L, lab.a, lab.b, 1);
+        PutLab(LabOfTableLab(p, 1, x, LabHalf(p, 1)), record);
     }
-    record[0] = lab.L * kLightnessScale;
-    record[1] = lab.a;
-    record[2] = lab.b;
 }
 
 int ReadNodeLab(CProfil& p, double* record, int slot, bool throughCurves) {
     const LutView t = SlotView(p, slot);
     if (t.inputs < 1 || t.outputs < 3) return 1;
     const int32_t node = NodeOffset(t, record + kFirstIndexField, true);
+    const bool curves = throughCurves && t.outputEntries >= 256;
     double v[3];
-    for (int j = 0; j < 3; ++j) {
-        v[j] = t.clut[node + j];
-        if (throughCurves && t.outputEntries >= 256) v[j] = OutputCurveAt(t, j, v[j]);
-        if (SixteenBit(p, slot)) v[j] *= CProfil::kInv257;
-    }
-    DecodeNodePcs(p, slot, v, record);
+    for (int j = 0; j < 3; ++j) v[j] = NodeOutput(p, t, slot, node, j, curves);
+    PutLab(DecodePcs(p, slot, v), record);
     return 1;
 }
 
@@ -174,7 +147,7 @@ int WriteNodeLab(CProfil& p, double* record, int slot) {
     if (t.inputs < 1) return 1;
     const int32_t node = NodeOffset(t, record + kFirstIndexField, true);
     double v[4] = {0, 0, 0, 0};
-    EncodeForNode(p, slot, record, -127.5, v);
+    EncodePcs(p, slot, record, -127.5, v);
     const bool wide = SixteenBit(p, slot);
     const double bound = wide ? 65535.0 : 255.0;
     uint16_t* clut = p.m_Clut[slot].data();
@@ -195,9 +168,10 @@ int WriteNodeChannelLab(CProfil& p, double* record, int slot) {
     const double bound = wide ? 65535.0 : 255.0;
     uint16_t* clut = p.m_Clut[slot].data();
 
-    Lab in{Clamp(record[0], 0.0, 255.0) / kLightnessScale, Clamp(record[1], -128.0, 127.0),
-           Clamp(record[2], -128.0, 127.0)};
     if (IsXyzPcs(lut)) {
+        // All three outputs, from XYZ without the table's matrix.
+        const Lab in{Clamp(record[0], 0.0, 255.0) / kLightnessScale, Clamp(record[1], -128.0, 127.0),
+                     Clamp(record[2], -128.0, 127.0)};
         XYZ xyz = p.LabToXYZ(in.L, in.a, in.b);
         if (p.m_UseMediaWhite[slot]) xyz = p.AdaptToRelative(xyz.X, xyz.Y, xyz.Z, slot);
         const double v[3] = {xyz.X * kXyzToTable, xyz.Y * kXyzToTable, xyz.Z * kXyzToTable};
@@ -205,10 +179,8 @@ int WriteNodeChannelLab(CProfil& p, double* record, int slot) {
         return 1;
     }
     if (channel < 0 || channel > 2 || channel >= t.outputs) return 1;
-    if (p.m_UseMediaWhite[slot]) in = p.LabToRelative(in.L, in.a, in.b, slot);
-    const double half = LabHalf(p, slot);
-    double v[3] = {in.L * kLightnessScale, in.a + half, in.b + half};
-    if (v[channel] < 0.0) v[channel] = 0.0;
+    double v[3];
+    EncodePcs(p, slot, record, -128.0, v);
     double stored;
     if (!wide) {
         stored = v[channel] + 0.5;
@@ -225,13 +197,7 @@ int ReadNodeDevice(CProfil& p, double* record, bool throughCurves) {
     const LutView t = SlotView(p, 1);
     if (t.inputs < 1) return 1;
     const int32_t node = NodeOffset(t, record + DeviceIndexField(t.inputs), true);
-    const bool wide = SixteenBit(p, 1);
-    for (int j = 0; j < t.outputs; ++j) {
-        double v = t.clut[node + j];
-        if (throughCurves) v = OutputCurveAt(t, j, v);
-        if (wide) v *= CProfil::kInv257;
-        record[j] = v;
-    }
+    for (int j = 0; j < t.outputs; ++j) record[j] = NodeOutput(p, t, 1, node, j, throughCurves);
     return 1;
 }
 
@@ -241,7 +207,7 @@ namespace {
 // halving steps while far off, then single steps up and down. A flat stretch at zero leaves k
 // at its upper end, a flat stretch at the top at its lower end.
 int32_t ValueForCurve(const LutView& t, int j, int32_t wanted, int32_t bound) {
-    auto image = [&](int32_t k) { return static_cast<int32_t>(OutputCurveAt(t, j, k)); };
+    auto image = [&](int32_t k) { return static_cast<int32_t>(t.OutputCurveAt(j, k)); };
     constexpr int32_t kFar = 4097;
     constexpr int kMaxHalvings = 100;
     constexpr int kMaxFlatSteps = 4096;
@@ -277,11 +243,8 @@ int WriteNodeDevice(CProfil& p, double* record, bool throughCurves) {
     const int outputs = t.outputs < 7 ? t.outputs : 7;
     for (int j = 0; j < outputs; ++j) {
         const double value = j < 4 ? record[j] : record[j + 10];
-        const double scaled = wide ? value * 257.0 : value + 0.5;
-        int32_t target = 0;
-        if (scaled > 0.0) target = scaled >= bound ? bound : static_cast<int32_t>(scaled);
-        const int32_t k = throughCurves ? ValueForCurve(t, j, target, bound) : target;
-        clut[node + j] = static_cast<uint16_t>(k);
+        const int32_t target = Store(wide ? value * 257.0 : value + 0.5, bound);
+        clut[node + j] = static_cast<uint16_t>(throughCurves ? ValueForCurve(t, j, target, bound) : target);
     }
     return 1;
 }
