@@ -1,14 +1,11 @@
-// The constrained device searches: their separation rules on tables of known colours, and the
-// ranged search on a real press profile.
+// The constrained device searches: one case per rule on tables of known colours, and the ranged
+// search on a real press profile.
 #include <gtest/gtest.h>
 
 #include <random>
 
-#include "colour/colour_math.h"
 #include "eval/device_search.h"
-#include "eval/forward.h"
-#include "eval_oracle.h"
-#include "synthetic_profiles.h"
+#include "eval_helpers.h"
 
 namespace vantrel {
 namespace {
@@ -17,47 +14,52 @@ using namespace test;
 
 // L* = 60 - 24 c, a* = 40 m, b* = 40 y (fractions of the device values); black does nothing.
 // On the 12.75 lattice: L* = 60 - 1.2 i, a* = 2 j, b* = 2 k.
-Lab Ramps(const std::vector<double>& f) { return Lab{60 - 24 * f[0], 40 * f[1], 40 * f[2]}; }
-
 class SearchOnRamps : public ::testing::Test {
 protected:
     void SetUp() override {
-        WriteAndLoad(p_, dir_, "ramps.icc", "CMYK", {{"A2B1", Mft2Tag(DeviceToLabLut(4, 2, Ramps))}});
+        auto ramps = [](const std::vector<double>& f) { return Lab{60 - 24 * f[0], 40 * f[1], 40 * f[2]}; };
+        WriteAndLoad(p_, dir_, "CMYK", {{"A2B1", Mft2Tag(DeviceToLabLut(4, 2, ramps))}});
     }
-    Lab Colour(const double* device) {
-        double v[4] = {device[0], device[1], device[2], device[3]};
-        CmykToLab(p_, v);
-        return Lab{v[0] / 2.55, v[1], v[2]};
+    // The difference from the target to the colour of a device vector.
+    double To(const double* target, const double* device) {
+        return Difference(CmykLab(p_, device), Lab{target[0], target[1], target[2]});
     }
     TempDir dir_;
     CProfil p_;
     const int allChroma_[7] = {1, 1, 1, 0, 0, 0, 0};
     const double start_[7] = {106.25, 0, 0, 0, 0, 0, 0};  // L* 50, a* = b* = 0
+    // Lattice colours near it: L* 40.8 (i = 16) and 39.6 (i = 17, closer but darker).
+    const double target_[3] = {40.1, 21.0, 20.0};
 };
 
 TEST_F(SearchOnRamps, LightnessRuleRefusesACloserColourDarkerThanTargetAndStart) {
-    // Lattice colours near the target: L* 40.8 (i = 16) and 39.6 (i = 17, closer but darker).
-    const double target[3] = {40.1, 21.0, 20.0};
-    const double startDelta = Difference(Colour(start_), Lab{target[0], target[1], target[2]});
     for (bool rule : {false, true}) {
         double best[7];
-        double delta = startDelta;
-        ConstrainedGridSearch(p_, target, start_, 0, 0, delta, 12.75, 3, allChroma_, rule, best);
+        double delta = To(target_, start_);
+        ConstrainedGridSearch(p_, target_, start_, 0, 0, delta, 12.75, 3, allChroma_, rule, best);
         EXPECT_DOUBLE_EQ(best[0], 12.75 * (rule ? 16 : 17)) << rule;
-        // a* 20 and 22 are equally far: the first one found stays.
         EXPECT_DOUBLE_EQ(best[1], 12.75 * 10) << rule;
         EXPECT_DOUBLE_EQ(best[2], 12.75 * 10) << rule;
-        EXPECT_NEAR(delta, Difference(Colour(best), Lab{target[0], target[1], target[2]}), 1e-9);
+        EXPECT_NEAR(delta, To(target_, best), 1e-9);
     }
 }
 
+TEST_F(SearchOnRamps, ACandidateOnlyAsGoodAsTheBestIsNotTaken) {
+    // On the lattice of step 255 every point is a node and black changes nothing: both black
+    // values of the answer give the same colour to the last bit, and the first one found stays.
+    const int withBlack[7] = {1, 1, 1, 1, 0, 0, 0};
+    double best[7];
+    double delta = To(target_, start_);
+    ConstrainedGridSearch(p_, target_, start_, 0, 255, delta, 255, 4, withBlack, false, best);
+    EXPECT_EQ(std::vector<double>(best, best + 4), (std::vector<double>{255, 0, 0, 0}));
+}
+
 TEST_F(SearchOnRamps, AnswersStayCloserToTheStartColourThanTheIncomingError) {
-    const double target[3] = {40.1, 21.0, 20.0};
     double best[7];
     double delta = 5.0;  // nothing within 5 of the start improves on it
-    ConstrainedGridSearch(p_, target, start_, 0, 0, delta, 12.75, 3, allChroma_, false, best);
+    ConstrainedGridSearch(p_, target_, start_, 0, 0, delta, 12.75, 3, allChroma_, false, best);
     EXPECT_EQ(std::vector<double>(best, best + 7), std::vector<double>(start_, start_ + 7));
-    EXPECT_NEAR(delta, Difference(Colour(start_), Lab{target[0], target[1], target[2]}), 1e-9);
+    EXPECT_NEAR(delta, To(target_, start_), 1e-9);
 }
 
 TEST_F(SearchOnRamps, BlackAloneWithOneValueGivesThatVector) {
@@ -65,7 +67,7 @@ TEST_F(SearchOnRamps, BlackAloneWithOneValueGivesThatVector) {
     const double from[7] = {10, 10, 10, 0, 0, 0, 0};
     const double target[3] = {60.1, -0.1, -0.1};  // just past (60, 0, 0) seen from the start
     double best[7];
-    double delta = Difference(Colour(from), Lab{target[0], target[1], target[2]});
+    double delta = To(target, from);
     ConstrainedGridSearch(p_, target, from, 51, 51, delta, 12.25, 3, blackOnly, false, best);
     EXPECT_EQ(std::vector<double>(best, best + 7), (std::vector<double>{0, 0, 0, 51, 0, 0, 0}));
     EXPECT_NEAR(delta, std::sqrt(0.03), 0.01);  // a* = 0 is stored as 32768 / 257 - 127.5
@@ -82,8 +84,7 @@ TEST_F(SearchOnRamps, DescentMovesOnlyFlaggedChannelsWithinTheChannelLimit) {
     EXPECT_NEAR(best[1], 127.5, 0.2);
     EXPECT_EQ(best[2], 0.0);
     EXPECT_EQ(best[3], 0.0);
-    EXPECT_NEAR(delta, Difference(Colour(best), Lab{target[0], target[1], target[2]}), 1e-9);
-
+    EXPECT_NEAR(delta, To(target, best), 1e-9);
     // With one channel allowed, magenta may not join cyan.
     ConstrainedDescent(p_, target, start_, delta, 1, cyanMagenta, false, best);
     EXPECT_EQ(best[1], 0.0);
@@ -96,7 +97,6 @@ TEST_F(SearchOnRamps, ScansKeepTheLastOfEqualValuesAndRangedDescentRespectsItsBo
     // Black changes nothing: every value is as good, the last one wins.
     EXPECT_EQ(ScanChannel(p_, target, v, 3, 10, 100), 100.0);
     EXPECT_EQ(ScanChannel(p_, target, v, 1, 0, 0), 0.0);  // magenta: a* = 0 only at 0
-
     // A channel at the lower bound never moves, however much it would help.
     const double from[4] = {0, 30, 40, 50};
     const int flags[4] = {1, 1, 1, 1};
@@ -107,13 +107,13 @@ TEST_F(SearchOnRamps, ScansKeepTheLastOfEqualValuesAndRangedDescentRespectsItsBo
     EXPECT_LT(best[1], 30.0);
 }
 
-// L* = 80 - 30 c0 - 30 c4 on seven colourants: reaching L* 20 needs colourants 0 and 4 together.
+// L* = 80 - 30 c0 - 30 c-partner on seven colourants: reaching L* 20 needs both together.
 TEST(ConstrainedSearch, RefusedColourantPairsAreNeverAnswered) {
     TempDir dir;
     for (int partner : {4, 1}) {
         CProfil p;
         auto lab = [partner](const std::vector<double>& f) { return Lab{80 - 30 * f[0] - 30 * f[partner], 0, 0}; };
-        WriteAndLoad(p, dir, "seven.icc", "MCH7", {{"A2B1", Mft2Tag(DeviceToLabLut(7, 2, lab))}});
+        WriteAndLoad(p, dir, "MCH7", {{"A2B1", Mft2Tag(DeviceToLabLut(7, 2, lab))}});
         ASSERT_EQ(p.m_Lut[0].inputChannels, 7);
         const double start[7] = {0, 0, 0, 0, 0, 0, 0};
         const int flags[7] = {1, 1, 1, 1, 1, 1, 1};
@@ -137,21 +137,19 @@ TEST(RangedSearch, ReachesPressColoursAndReportsTheErrorOfItsAnswer) {
     const std::string path = FixtureProfile("FOGRA39L");
     if (path.empty()) GTEST_SKIP() << "FOGRA39L.icc not built";
     CProfil p;
-    ASSERT_TRUE(LoadProfile(p, path, "A2B1", "B2A1", false));
+    ASSERT_TRUE(LoadProfile(p, path));
     std::mt19937 rng(5);
     std::uniform_real_distribution<double> value(20, 235);
     DeltaStats stats;
     for (int t = 0; t < 40; ++t) {
-        double cmyk[4] = {value(rng), value(rng), value(rng), value(rng)};
-        CmykToLab(p, cmyk);
-        const double target[3] = {cmyk[0] / 2.55, cmyk[1], cmyk[2]};
+        const double cmyk[4] = {value(rng), value(rng), value(rng), value(rng)};
+        const Lab target = CmykLab(p, cmyk);
+        const double wanted[3] = {target.L, target.a, target.b};
         const double start[4] = {128, 128, 128, 128};
         double best[4];
         double delta = -1;
-        RangedSearch(p, target, start, 0, 255, delta, best);
-        double check[4] = {best[0], best[1], best[2], best[3]};
-        CmykToLab(p, check);
-        EXPECT_NEAR(delta, DeltaE(target[0], target[1], target[2], check[0] / 2.55, check[1], check[2]), 1e-9);
+        RangedSearch(p, wanted, start, 0, 255, delta, best);
+        EXPECT_NEAR(delta, Difference(CmykLab(p, best), target), 1e-9);
         stats.Add(delta);
     }
     stats.Report("FOGRA39L RangedSearch from mid grey");
