@@ -16,14 +16,13 @@
 #include "eval/inverse.h"
 #include "icc/profil.h"
 
+#include "bench_fixtures.h"
+
 namespace {
 
 constexpr int kColours = 4096;
 
-std::string Fogra() {
-    const std::string path = std::string(VANTREL_FIXTURE_DIR) + "/FOGRA39L.icc";
-    return std::filesystem::exists(path) ? path : std::string();
-}
+using vantrel::bench::Fogra;
 
 // The paper profile as the tool loads it: both directions, absolute colorimetry.
 std::unique_ptr<vantrel::CProfil> LoadFogra() {

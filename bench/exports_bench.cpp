@@ -10,14 +10,13 @@
 
 #include "vantrel.h"
 
+#include "bench_fixtures.h"
+
 namespace {
 
 constexpr int kRecords = 100000;
 
-std::string Fogra() {
-    const std::string path = std::string(VANTREL_FIXTURE_DIR) + "/FOGRA39L.icc";
-    return std::filesystem::exists(path) ? path : std::string();
-}
+using vantrel::bench::Fogra;
 
 int Quiet(const char*, int, int) { return 0; }
 

@@ -10,12 +10,11 @@
 #include "colour/colour_math.h"
 #include "icc/profil.h"
 
+#include "bench_fixtures.h"
+
 namespace {
 
-std::string Fogra() {
-    const std::string path = std::string(VANTREL_FIXTURE_DIR) + "/FOGRA39L.icc";
-    return std::filesystem::exists(path) ? path : std::string();
-}
+using vantrel::bench::Fogra;
 
 void LoadFograTables(benchmark::State& state) {
     const std::string path = Fogra();
