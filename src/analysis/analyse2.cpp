@@ -39,7 +39,7 @@ void CIterativtoolDlg::IsdAnalysis() {
 
     std::vector<PatchRecord> records(static_cast<std::size_t>(n));
     records[0].kind = 4;
-    const bool fromXyz = It8ColourFromXyz(*m_MeasIT8);
+    const bool fromXyz = It8ColourFromXyz(*m_MeasIT8, kScanProbePatch);
     for (int i = 0; i < n; ++i) {
         PatchRecord& record = records[static_cast<std::size_t>(i)];
         const Lab measured = PatchLab(*m_MeasIT8, i, fromXyz);
@@ -70,6 +70,9 @@ int Analyse2(CIterativtoolDlg& tool, const char* isdProfile, const char* outIT8,
              int* out2) {
     tool.m_ISDMode = 1;
     tool.m_ISDName = Text(isdProfile);
+    // The tables of the previous call go first, so that a profile that fails to load cannot leave
+    // them in use; the new ones stay loaded after the call.
+    if (tool.m_ISDprof) tool.m_ISDprof->Release();
     tool.LoadISDProfile();
     tool.m_ReferenceIT8Name = Text(outIT8);
     tool.m_MeasIT8Name = Text(measIT8);

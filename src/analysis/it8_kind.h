@@ -12,11 +12,16 @@ struct It8Kind {
     bool colourFromXyz = false;   // no Lab columns: colours come from XYZ
 };
 
-// Probes patch 1. A file of one patch is probed past its end, where the accessors answer -1
-// rather than the missing-column marker: it counts as seven-channel with Lab colours.
-It8Kind ProbeIt8Kind(const Measured_IT8& it8);
+// The patch the measurement scans and the ISD analysis probe: the second one. The merged
+// analysis and the measurement-driven optimisations probe the first (patch 0).
+constexpr int kScanProbePatch = 1;
 
-// True when the second patch has no Lab: colours then come from the XYZ columns.
-bool It8ColourFromXyz(const Measured_IT8& it8);
+// Decides the kind from `patch`. A file too short for it is probed past its end, where the
+// accessors answer -1 rather than the missing-column marker: it counts as seven-channel with
+// Lab colours.
+It8Kind ProbeIt8Kind(const Measured_IT8& it8, int patch);
+
+// True when `patch` has no Lab: colours then come from the XYZ columns.
+bool It8ColourFromXyz(const Measured_IT8& it8, int patch);
 
 }  // namespace vantrel

@@ -54,7 +54,7 @@ Lab CIterativtoolDlg::PatchLab(const Measured_IT8& it8, int patch, bool fromXyz)
 Lab CIterativtoolDlg::ScanIt8ForValues(const Measured_IT8& it8, const double target[7]) const {
     const int n = it8.PatchCount();
     if (n < 1) return Lab{};
-    const It8Kind kind = ProbeIt8Kind(it8);
+    const It8Kind kind = ProbeIt8Kind(it8, kScanProbePatch);
     if (kind.device == It8Kind::kNoDevice) return Lab{};
 
     Progress(kScanValues, 0, n);
@@ -72,7 +72,7 @@ Lab CIterativtoolDlg::ScanIt8ForValues(const Measured_IT8& it8, const double tar
 Lab CIterativtoolDlg::ScanIt8ForWhitePoint(const Measured_IT8& it8) const {
     const int n = it8.PatchCount();
     if (n < 1) return Lab{};
-    const It8Kind kind = ProbeIt8Kind(it8);
+    const It8Kind kind = ProbeIt8Kind(it8, kScanProbePatch);
     if (kind.device == It8Kind::kNoDevice) return Lab{};
 
     Lab sum;

@@ -222,7 +222,11 @@ GamutRecord EmptyRecord() {
 
 }  // namespace
 
+bool HoldsBothTables(const CProfil& p) { return p.SlotHolds(0) && p.SlotHolds(1); }
+
 GamutRecord BuildGamutRecord(CProfil& p) {
+    // Descriptors without tables (a failed load) describe nothing to push colours through.
+    if (!HoldsBothTables(p)) return EmptyRecord();
     const int channels = GamutChannels(p.m_Lut[1]);
     if (channels == 0) return EmptyRecord();
     return GamutBuilder(p, channels).Build();
@@ -244,7 +248,7 @@ bool IsInGamut(const GamutRecord& g, double L, double a, double b) {
 
 Lab ReproducedLab(CProfil& p, double L, double a, double b) {
     double v[CProfil::kEvalSize] = {L * kLightnessScale, a, b};
-    const int channels = GamutChannels(p.m_Lut[1]);
+    const int channels = HoldsBothTables(p) ? GamutChannels(p.m_Lut[1]) : 0;
     if (channels != 0) {
         LabToDevice(p, v, channels);
         DeviceToLab(p, v, channels);

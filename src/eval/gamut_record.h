@@ -25,15 +25,19 @@ struct GamutRecord {
 // Describes the gamut of a profile with both directions loaded by pushing colours through its
 // two tables and back: table nodes, a Lab lattice and chroma sweeps at every hue and lightness.
 // The variant follows the direction-1 data colour space (RGB, four colourants, five to seven
-// colourants); any other space gives the empty record, which holds no colour.
+// colourants); any other space, or a profile that does not hold both tables, gives the empty
+// record, which holds no colour.
 GamutRecord BuildGamutRecord(CProfil& profile);
+
+// True when the profile holds both tables, so that a gamut can be built from it.
+bool HoldsBothTables(const CProfil& profile);
 
 // True when the colour (L* unscaled) lies inside the recorded gamut.
 bool IsInGamut(const GamutRecord& record, double L, double a, double b);
 
 // The colour the profile prints for a requested one (L* unscaled): the Lab through the
-// direction-1 table and back through the direction-0 table. Profiles of other colour spaces
-// give the colour back unchanged.
+// direction-1 table and back through the direction-0 table. Profiles of other colour spaces,
+// and profiles without both tables, give the colour back unchanged.
 Lab ReproducedLab(CProfil& profile, double L, double a, double b);
 
 }  // namespace vantrel

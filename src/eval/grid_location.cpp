@@ -52,7 +52,7 @@ double LocateNearestNode(CProfil& p, double* record, int slot) {
     return std::sqrt(sum);
 }
 
-double LocateCell(CProfil& p, double* record, int slot, double* weights) {
+double LocateCell(CProfil& p, double* record, int slot, CornerWeights& weights) {
     const LutView t = SlotView(p, slot);
     double inputs[7];
     if (!RecordInputs(p, record, slot, t, inputs)) return 0.0;
@@ -86,6 +86,15 @@ double LocateCell(CProfil& p, double* record, int slot, double* weights) {
         }
     }
     return std::sqrt(sum);
+}
+
+void PlaceLocatedNode(const CProfil& p, double* record, int slot, NodeFields fields) {
+    const int n = (slot == 0 || slot == 1) ? p.m_Lut[slot].inputChannels : 0;
+    if (n < 1 || n > CProfil::kMaxInputs) return;
+    double indices[CProfil::kMaxInputs];
+    for (int i = 0; i < n; ++i) indices[i] = record[i];
+    const int first = fields == NodeFields::kDevice && n >= 4 ? n : 4;
+    for (int i = 0; i < n; ++i) record[first + i] = indices[i];
 }
 
 double WeightingPolynomial(double w) {

@@ -95,6 +95,7 @@ int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::strin
         return -1;
     };
     m_FileInputEntries[slot] = 0;
+    m_LegacyStretch[slot] = LegacyStretch{};
     m_OutputIdentity[slot] = 0;
     std::fill(std::begin(m_Eval), std::end(m_Eval), 0.0);
 
@@ -149,6 +150,9 @@ int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::strin
                 for (int c = 0; c < 3; ++c) lut.matrix[r][c] = inverse[r][c] / det;
         }
     } else {
+        // Nothing of an earlier load may stay behind to be taken for this table.
+        ResetSlot(slot);
+        ComputeSlotWhite(direction, slot);
         m_Tags[0].clear();
         m_Tags[1].clear();
         return -1;
@@ -226,7 +230,10 @@ int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::strin
     lut.pcs = CutSignature(file.Signature(20));
 
     const int32_t loaded = LoadTables(slot, file);
-    if (loaded == -2) return -2;
+    if (loaded == -2) {
+        ResetSlot(slot);
+        return -2;
+    }
     if (loaded != 1) return unusable();
 
     if (lut.pcs == "Lab" && lut.colourSpace == "RGB " && lut.type == "MATR") lut.pcs = "XYZ";
@@ -292,8 +299,13 @@ int32_t CProfil::LoadTables(int slot, const IccBytes& file) {
                 uint16_t* curve = output.data() + channel * outEntries;
                 if (curve[outEntries - 1] == kLegacyWhite) StretchLegacy(curve, outEntries, 1);
             }
-            if (m >= 3 && clut[0] == kLegacyWhite && clut[1] == 0x8000 && clut[2] == 0x8000)
+            if (m >= 3 && clut[0] == kLegacyWhite && clut[1] == 0x8000 && clut[2] == 0x8000) {
+                LegacyStretch& stretch = m_LegacyStretch[slot];
+                stretch.clut = true;
+                for (uint64_t k = 0; k < clut.size(); k += m)
+                    if (clut[k] > kLegacyWhite) stretch.clipped.emplace_back(static_cast<uint32_t>(k), clut[k]);
                 StretchLegacy(clut.data(), clut.size(), m);
+            }
             MarkIdentityOutput(slot);
             return 1;
         }

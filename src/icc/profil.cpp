@@ -23,7 +23,14 @@ void CProfil::Release() {
         m_Clut[slot] = {};
         m_OutputCurves[slot] = {};
         for (auto& curve : m_Trc[slot].curve) curve = {};
+        // The descriptors go too: a later load that fails must not find the old counts and spaces.
+        m_Lut[slot] = LutSlot{};
+        m_Corners[slot] = 0;
     }
+    m_FileInputEntries[0] = m_FileInputEntries[1] = 0;
+    m_LegacyStretch[0] = m_LegacyStretch[1] = LegacyStretch{};
+    m_LoadedTag[0] = m_LoadedTag[1] = 0;
+    m_Precision[1] = 0;
     m_Precision[0] = kReleasedMarker;
 }
 
@@ -49,9 +56,13 @@ void CProfil::ResetSlot(int slot) {
     m_InputCurves[slot] = {};
     m_Clut[slot] = {};
     m_OutputCurves[slot] = {};
+    m_LegacyStretch[slot] = LegacyStretch{};
+    // The matrix and colorant count come from the direction's directory and stay with it.
     LutSlot& lut = m_Lut[slot];
     lut.tagIndex = 0;
     lut.type.clear();
+    lut.pcs.clear();
+    lut.colourSpace.clear();
     lut.inputChannels = lut.inputEntries = lut.outputChannels = lut.outputEntries = lut.gridPoints = 0;
 }
 

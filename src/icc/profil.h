@@ -2,6 +2,7 @@
 
 #include <cstdint>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "colour/colour_values.h"
@@ -45,6 +46,14 @@ struct MatrixTrc {
     int32_t flag = 0;
     std::vector<double> curve[3];  // R, G, B; empty until the TRC tag is read
     double gamma[3] = {0, 0, 0};   // from one-entry curves
+};
+
+// What the loader stretched of a legacy v2 Lab table (L* = 100 at 0xFF00), so that the writer
+// can put the file's own encoding back and an unchanged table rewrites identical bytes.
+struct LegacyStretch {
+    bool clut = false;  // the first output of every CLUT node was stretched by 257/256
+    // File values above 0xFF00 that the stretch clipped to 0xFFFF: CLUT position, file value.
+    std::vector<std::pair<uint32_t, uint16_t>> clipped;
 };
 
 // Per-input-channel scratch of the interpolation kernels.
@@ -140,11 +149,15 @@ public:
     // Recomputes the media white from the slot's white and writes it into `path`'s "wtpt" tag
     // (when the file has one of type "XYZ "). True when written.
     bool WriteWhitePoint(int direction, const std::string& path);
+    // The slot's CLUT in the file's own encoding: legacy Lab tables with their stretch undone.
+    std::vector<uint16_t> ClutAsInFile(int slot) const;
     std::vector<uint16_t> SnapshotClut(int slot) const;
     // Copies a snapshot of the same size back into the slot's CLUT; false (nothing copied) otherwise.
     bool RestoreClut(int slot, const std::vector<uint16_t>& snapshot);
-    // Writes the slot-1 CLUT to `path`, then fills `buffer` (`words` 16-bit words) with the 3-input
-    // layout: grid, strides, corner offsets, values, byte size. False when it does not fit.
+    // Writes the slot-1 CLUT to `path` (any table with a CLUT; a matrix/TRC slot is refused), then,
+    // for a table of three inputs and at least three outputs, fills `buffer` (`words` 16-bit words)
+    // with the host's layout: grid, strides, corner offsets, values, byte size. A buffer too small
+    // for it, or a table of another shape, is left untouched. True when the table was written.
     bool ExportClut3(const std::string& path, uint16_t* buffer, size_t words);
     int32_t GridPoints(int kind) const;  // 1 -> slot 1, 2 -> slot 2, otherwise slot 0
 
@@ -216,6 +229,9 @@ public:
 
     // The input-entries count of the file when it was below 256 (the curves are held resampled).
     int32_t m_FileInputEntries[2] = {0, 0};
+
+    // Per slot: what the loader stretched of a legacy Lab CLUT.
+    LegacyStretch m_LegacyStretch[2];
 
     LutSlot m_Lut[kSlots];
 

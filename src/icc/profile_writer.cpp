@@ -82,7 +82,7 @@ bool CProfil::WriteClut(int direction, const std::string& path) {
     if (!file.Load(path)) return false;
     const uint64_t position = LoadedClutPosition(*this, direction, file);
     if (position == 0) return false;
-    const std::vector<uint16_t>& clut = m_Clut[direction];
+    const std::vector<uint16_t> clut = ClutAsInFile(direction);
     std::vector<uint8_t> bytes;
     if (m_Lut[direction].type == "mft1") {
         bytes.reserve(clut.size());
@@ -110,6 +110,19 @@ bool CProfil::WriteWhitePoint(int direction, const std::string& path) {
     return Patch(path, position, bytes);
 }
 
+std::vector<uint16_t> CProfil::ClutAsInFile(int slot) const {
+    slot = slot == 0 ? 0 : 1;
+    std::vector<uint16_t> clut = m_Clut[slot];
+    const LegacyStretch& stretch = m_LegacyStretch[slot];
+    if (!stretch.clut) return clut;
+    const size_t m = static_cast<size_t>(m_Lut[slot].outputChannels);
+    for (size_t k = 0; k < clut.size(); k += m) clut[k] = static_cast<uint16_t>(std::floor(clut[k] * 256.0 / 257.0 + 0.5));
+    // Values the stretch clipped come back as the file had them while the table still holds the clip.
+    for (const auto& [position, value] : stretch.clipped)
+        if (position < clut.size() && m_Clut[slot][position] == 0xFFFF) clut[position] = value;
+    return clut;
+}
+
 std::vector<uint16_t> CProfil::SnapshotClut(int slot) const { return m_Clut[slot == 0 ? 0 : 1]; }
 
 bool CProfil::RestoreClut(int slot, const std::vector<uint16_t>& snapshot) {
@@ -121,11 +134,15 @@ bool CProfil::RestoreClut(int slot, const std::vector<uint16_t>& snapshot) {
 
 bool CProfil::ExportClut3(const std::string& path, uint16_t* buffer, size_t words) {
     const LutSlot& lut = m_Lut[1];
-    if (!SlotHolds(1) || lut.inputChannels != 3 || lut.outputChannels < 3) return false;
-    WriteClut(1, path);
+    // A matrix/TRC slot has no CLUT to write or hand over.
+    if (!SlotHolds(1) || lut.type == "MATR") return false;
+    // The table goes to the file whatever its shape: a link of four to seven channels is
+    // corrected as well as a three-channel one.
+    const bool written = WriteClut(1, path);
+    // The host's layout describes three-input tables; any other leaves the buffer as it was.
     const size_t g = static_cast<size_t>(lut.gridPoints);
     const size_t nodes = g * g * g;
-    if (!buffer || words < 13 + 3 * nodes) return false;
+    if (lut.inputChannels != 3 || lut.outputChannels < 3 || !buffer || words < 13 + 3 * nodes) return written;
     auto word = [](size_t value) { return static_cast<uint16_t>(value); };
     buffer[0] = word(g);
     buffer[1] = word(g * g);
@@ -137,7 +154,7 @@ bool CProfil::ExportClut3(const std::string& path, uint16_t* buffer, size_t word
     for (size_t node = 0; node < nodes; ++node)
         for (size_t out = 0; out < 3; ++out) buffer[12 + 3 * node + out] = m_Clut[1][node * m + out];
     buffer[12 + 3 * nodes] = word(6 * nodes + 26);
-    return true;
+    return written;
 }
 
 int32_t CProfil::GridPoints(int kind) const { return m_Lut[kind == 1 ? 1 : kind == 2 ? 2 : 0].gridPoints; }

@@ -66,6 +66,7 @@ void CIterativtoolDlg::LoadPaperProfile(bool computeGamut) {
     m_PaperWhite = m_Paperprof->WhiteLab(0);
     if (computeGamut) {
         m_Gamut = BuildGamutRecord(*m_Paperprof);
+        m_GamutComputed = HoldsBothTables(*m_Paperprof);
         Progress("load paper profile", 3, 4);
     }
     // A record from an earlier call stays in use when the gamut is not rebuilt.

@@ -46,7 +46,9 @@ public:
     // The average colour of the patches printed without ink.
     Lab ScanIt8ForWhitePoint(const Measured_IT8& it8) const;
     // Lab of a measured XYZ (white Y near 100) against the first loaded profile's illuminant
-    // (m_Outprof, m_Paperprof, m_Refprof, m_ISDprof), else against D50.
+    // (m_Outprof, m_Paperprof, m_Refprof, m_ISDprof), else against D50. The one conversion for
+    // measured XYZ: the scans, the analyses and the measurement-driven optimisations all use it,
+    // so that a patch and the white found in the same file are converted alike.
     Lab MeasuredXyzToLab(double X, double Y, double Z) const;
     // A patch's colour, from its Lab or converted from its XYZ.
     Lab PatchLab(const Measured_IT8& it8, int patch, bool fromXyz) const;
@@ -90,6 +92,9 @@ public:
     Lab m_PaperWhite;
 
     GamutRecord m_Gamut;
+    // True once m_Gamut was built from a profile holding both tables. The loader marks the record
+    // valid whether or not it was built this time; this says whether it describes a gamut at all.
+    bool m_GamutComputed = false;
 
     // A saved copy of the paper profile's table, kept by the output-profile optimisation.
     std::vector<uint16_t> m_SavedTable;

@@ -13,8 +13,9 @@ struct PatchRecord {
     double device[7] = {0, 0, 0, 0, 0, 0, 0};
     double lab[3] = {0, 0, 0};
     double xyz[3] = {0, 0, 0};  // 0..100
-    // Scratch of the code that fills the records; never written to a file.
-    uint8_t work[256] = {};
+    // Scratch of the code that fills the records (the merged analysis marks patches here); never
+    // written to a file. Small on purpose: the output-profile analysis holds two buffers of 21^4.
+    uint8_t work[8] = {};
 };
 
 }  // namespace vantrel

@@ -127,3 +127,31 @@ TEST(Analyse2, MissingOrBrokenMeasurementsWriteNothing) {
     // Null names are empty names.
     EXPECT_EQ(analyse2(host.tool.h, nullptr, nullptr, nullptr, nullptr, nullptr), 0);
 }
+
+// An ISD profile that cannot be used on the second call must not leave the first call's table in
+// use: the measurement is then copied as it is, not sent through the earlier profile.
+TEST(Analyse2, ANewIsdWithoutItsTableNeverReusesThePreviousOne) {
+    Host host;
+    // Lab to Lab, halving L* (a 16-bit Lab table holds L* 100 at 65535, a* and b* 0 at 32896).
+    const LutSpec half = MakeLut(3, 3, 3, [](const std::vector<int>& node, int out) {
+        return static_cast<uint16_t>(out == 0 ? node[0] * 65535 / 4 : 32896);
+    });
+    const Bytes wtpt = XyzTag(0.9642, 1.0, 0.8249);
+    const std::string halving = WriteFile(host.dir.File("half.icc"),
+        IccBuilder("Lab ", "Lab ", "abst").AddTag("A2B1", Mft2Tag(half)).AddTag("B2A1", Mft2Tag(half)).AddTag("wtpt", wtpt).Build());
+    const std::string noB2A = WriteFile(host.dir.File("nob2a.icc"),
+        IccBuilder("Lab ", "Lab ", "abst").AddTag("A2B1", Mft2Tag(half)).AddTag("wtpt", wtpt).Build());
+    const std::string text = Cgats("ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B", {"1 0 0 0 0 95 0 0", "2 0 0 0 0 95 0 0"});
+    const std::string out = host.dir.File("out.it8");
+
+    ASSERT_EQ(host.Run(halving, out, WriteText(host.dir, "first.it8", text)), 0);
+    Measured_IT8 first;
+    ASSERT_EQ(first.ReadIt8(out), 0);
+    EXPECT_NEAR(first.GetLab(0, 0), 47.5, 0.5);  // the first profile did apply
+
+    const std::string second = WriteText(host.dir, "second.it8", text);
+    ASSERT_EQ(host.Run(noB2A, out, second), 0);
+    EXPECT_EQ(ReadText(out), text);
+    EXPECT_FALSE(fs::exists(second + "isd.it8"));
+    EXPECT_FALSE(host.Tool().m_ISDprof->SlotHolds(1));
+}

@@ -187,7 +187,7 @@ TEST(GridLocation, ColoursOnANodeAndHalfWayBetweenTwo) {
                  {{"A2B1", Mft2Tag(DeviceToLabLut(4, 5, [](const std::vector<double>&) { return Lab{50, 0, 0}; }))}});
     LoadDeviceTable(device, dir, LinearCurve(1024));
     auto fields = [](const double* record, int n) { return std::vector<double>(record, record + n); };
-    double weights[128];
+    CornerWeights weights{};
     // Device side (slot 0, 5 points): on node (1, 2, 0, 4), then half-way along channel 0.
     const double step = 255.0 / 4;
     double on[17] = {step, 2 * step, 0, 4 * step}, onCell[17] = {step, 2 * step, 0, 4 * step};

@@ -19,6 +19,16 @@ LutSpec RgbToCmyk(int grid, int inEntries, unsigned top = 65535) {
     }, inEntries, 256, top);
 }
 
+// Lab to Lab in the legacy encoding: white (0xFF00, 0x8000, 0x8000) at the first node, one L*
+// above 100, curves ending at 0xFF00.
+LutSpec LegacyLab() {
+    return MakeLut(3, 3, 3, [](const std::vector<int>& node, int out) {
+        if (out > 0) return static_cast<uint16_t>(0x8000 + 0x300 * node[out] - 0x100 * node[0]);
+        if (node[0] == 1 && node[1] == 1 && node[2] == 1) return uint16_t{0xFF80};
+        return static_cast<uint16_t>(0xFF00 - 0x2345 * node[0] - 0x111 * node[1] - 0x11 * node[2]);
+    }, 256, 256, 0xFF00);
+}
+
 // How many bytes differ between two files of the same size.
 size_t Differences(const Bytes& a, const Bytes& b) {
     size_t count = 0;
@@ -46,6 +56,10 @@ TEST(WriteClut, UnchangedTablesRewriteIdenticallyAndOneNodeChangesOnlyItsBytes) 
          "A2B0", cmsSigAToB0Tag},
         {dir.File("v4.icc"), 0, "A2B0", cmsSigAToB0Tag},
         {dir.File("v4.icc"), 1, "B2A0", cmsSigBToA0Tag},
+        // Legacy Lab encoding (L* 100 at 0xFF00), held stretched, written back as the file had it,
+        // including an L* above 100 that the stretch clips.
+        {WriteFile(dir.File("legacy.icc"), IccBuilder("Lab ", "Lab ", "abst").AddTag("B2A1", Mft2Tag(LegacyLab())).Build()),
+         1, "B2A1", cmsSigBToA1Tag},
     };
     ASSERT_TRUE(WriteLcmsV4Profile(dir.File("v4.icc")));
     if (const std::string fogra = FixtureProfile("FOGRA39L"); !fogra.empty()) {
@@ -141,7 +155,9 @@ TEST(ExportClut3, FillsTheHostLayout) {
     ASSERT_EQ(p.LoadLut(1, "B2A1", path), 1);
     p.m_Clut[1][0] = 77;
     std::vector<uint16_t> buffer(13 + 3 * 64, 0xEEEE);
-    EXPECT_FALSE(p.ExportClut3(path, buffer.data(), buffer.size() - 1));
+    // A buffer one word short is left alone; the table is written all the same.
+    EXPECT_TRUE(p.ExportClut3(path, buffer.data(), buffer.size() - 1));
+    EXPECT_EQ(buffer, std::vector<uint16_t>(buffer.size(), 0xEEEE));
     ASSERT_TRUE(p.ExportClut3(path, buffer.data(), buffer.size()));
     EXPECT_EQ(ReadWithLcms(path, cmsSigBToA1Tag).clut.at(0), 77);  // written to the file first
     const std::vector<uint16_t> head = {4, 16, 4, 1, 0, 48, 12, 3, 60, 51, 15, 63};
@@ -149,4 +165,33 @@ TEST(ExportClut3, FillsTheHostLayout) {
     EXPECT_EQ(buffer[12], 77);
     EXPECT_EQ(buffer[12 + 3 * 5 + 2], 2000 + 5);  // node (0, 1, 1), third output
     EXPECT_EQ(buffer[12 + 3 * 64], 6 * 64 + 26);
+}
+
+// Links of four to seven channels have no buffer layout, but their corrected table still reaches
+// the file; a matrix/TRC slot has no CLUT at all and is refused.
+TEST(ExportClut3, WritesEveryTableButFillsTheBufferForThreeInputsOnly) {
+    TempDir dir;
+    const LutSpec link = MakeLut(4, 4, 3, [](const std::vector<int>& node, int out) {
+        return static_cast<uint16_t>(20000 * node[out] + 7);
+    });
+    const std::string path = WriteFile(dir.File("link.icc"), IccBuilder("CMYK", "CMYK", "link").AddTag("A2B0", Mft2Tag(link)).Build());
+    CProfil p;
+    p.ReadTagTable(1, path);
+    ASSERT_EQ(p.LoadLut(1, "A2B0", path), 1);
+    p.m_Clut[1][5] = 4321;
+    std::vector<uint16_t> buffer(4096, 0xEEEE);
+    EXPECT_TRUE(p.ExportClut3(path, buffer.data(), buffer.size()));
+    EXPECT_EQ(ReadWithLcms(path, cmsSigAToB0Tag).clut.at(5), 4321);
+    EXPECT_EQ(buffer, std::vector<uint16_t>(4096, 0xEEEE));
+
+    const std::string srgb = SystemIccDir() + "sRGB.icc";
+    if (!std::filesystem::exists(srgb)) return;
+    std::filesystem::copy_file(srgb, dir.File("srgb.icc"));
+    const Bytes before = ReadFile(dir.File("srgb.icc"));
+    CProfil rgb;
+    rgb.ReadTagTable(1, dir.File("srgb.icc"));
+    ASSERT_EQ(rgb.LoadLut(1, "B2A1", dir.File("srgb.icc")), 1);
+    ASSERT_EQ(rgb.m_Lut[1].type, "MATR");
+    EXPECT_FALSE(rgb.ExportClut3(dir.File("srgb.icc"), buffer.data(), buffer.size()));
+    EXPECT_EQ(ReadFile(dir.File("srgb.icc")), before);
 }

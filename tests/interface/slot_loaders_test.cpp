@@ -6,6 +6,7 @@
 
 #include "helpers/icc_builder.h"
 #include "helpers/test_paths.h"
+#include "eval/gamut_record.h"
 #include "helpers/tool_handle.h"
 
 using namespace vantrel::test;
@@ -114,4 +115,32 @@ TEST_F(SlotLoaders, AMissingFileStillRunsEveryStep) {
     EXPECT_EQ(reports.size(), 5u);
     EXPECT_EQ(t.m_Gamut.valid, 1);
     EXPECT_EQ(Loaded(*t.m_Paperprof), "none none");
+}
+
+// A released profile keeps nothing a later failed load could take for a table: the gamut built
+// then describes nothing and the reproduced colour is the requested one.
+TEST(SlotLoadersAfterRelease, AFailedLoadBuildsNoGamutFromStaleDescriptors) {
+    const std::string fogra = FixtureProfile("FOGRA39L");
+    if (fogra.empty()) GTEST_SKIP() << "FOGRA39L fixture not built";
+    TempDir dir;
+    ToolHandle handle;
+    vantrel::CIterativtoolDlg& t = handle.Tool();
+    t.m_PaperName = fogra;
+    t.LoadPaperProfile(true);
+    ASSERT_TRUE(t.m_GamutComputed);
+    t.m_Paperprof->Release();
+    EXPECT_TRUE(t.m_Paperprof->m_Lut[1].colourSpace.empty());
+
+    t.m_PaperName = dir.File("absent.icc");
+    t.LoadPaperProfile(true);
+    EXPECT_FALSE(t.m_GamutComputed);
+    EXPECT_EQ(t.m_Gamut.valid, 1);  // the loader marks the record all the same
+    int filled = 0;
+    for (const auto& row : t.m_Gamut.chroma)
+        for (uint8_t cell : row) filled += cell != 255;
+    EXPECT_EQ(filled, 0);
+    const vantrel::Lab same = vantrel::ReproducedLab(*t.m_Paperprof, 50, 20, 20);
+    EXPECT_DOUBLE_EQ(same.L, 50);
+    EXPECT_DOUBLE_EQ(same.a, 20);
+    EXPECT_DOUBLE_EQ(same.b, 20);
 }
