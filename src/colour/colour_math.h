@@ -1,15 +1,13 @@
 #pragma once
 
 #include "colour/colour_values.h"
+#include "colour/companding.h"
 
 namespace vantrel {
 
 // pi as the hue computations of the library take it.
 constexpr double kHuePi = 3.1415926535;
 
-// The CIELAB companding function: linear below 0.008856, the cube root above (from the
-// single-precision table up to 1, the power function beyond).
-double CieF(double t);
 // Hue in degrees, 0 <= h < 360; 0 for a = b = 0.
 double HueAngle(double a, double b);
 // L clamped to 0..255 (scaled Lab allowed), a and b to -128..127; h = 0 when C = 0.

@@ -90,7 +90,7 @@ int LabThroughTable(CProfil& p, double* v, int slot) {
         EncodeForDirection1(p, v, true);
         InterpolateSimplex(p, 1);
         ScaleTableOutputs(p, 1, 3);
-        const double half = p.m_Precision[1] != 0 ? 127.5 : 128.0;
+        const double half = LabHalf(p, 1);
         v[0] = e[0] > 255.0 ? 255.0 : e[0];
         v[1] = e[1] - half;
         v[2] = e[2] - half;

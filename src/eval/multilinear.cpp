@@ -1,7 +1,7 @@
 // Multilinear interpolation (trilinear and its generalisation) of tables of up to seven inputs.
 #include "eval/interpolation.h"
 
-#include "eval/corner_order.h"
+#include "icc/corner_order.h"
 #include "eval/grid_coordinate.h"
 
 namespace vantrel {

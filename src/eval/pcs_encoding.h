@@ -11,7 +11,6 @@ namespace vantrel {
 // XYZ on the 0..100 scale.
 constexpr double kXyzToTable = 127.50194552529183;
 constexpr double kXyz100ToTable = 1.2750194552529184;
-constexpr double kLightnessScale = 2.55;
 
 inline double Clamp(double v, double lo, double hi) { return v < lo ? lo : (v > hi ? hi : v); }
 
@@ -29,11 +28,11 @@ inline bool SpaceIs(const std::string& space, const char* four) {
 }
 
 // The a*, b* offset of a table's Lab encoding: 128 for 8-bit tables, 127.5 for 16-bit ones.
-inline double LabHalf(const CProfil& p, int slot) { return p.m_Precision[slot] >= 1 ? 127.5 : 128.0; }
+inline double LabHalf(const CProfil& p, int slot) { return p.SixteenBit(slot) ? 127.5 : 128.0; }
 
 // Brings the first `count` outputs of a 16-bit table onto 0..255.
 inline void ScaleTableOutputs(CProfil& p, int slot, int count) {
-    if (p.m_Precision[slot] == 0) return;
+    if (!p.SixteenBit(slot)) return;
     for (int j = 0; j < count; ++j) p.m_Eval[j] *= CProfil::kInv257;
 }
 

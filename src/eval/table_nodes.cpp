@@ -4,6 +4,7 @@
 #include <cstdlib>
 
 #include "colour/colour_math.h"
+#include "colour/matrix3.h"
 #include "eval/grid_coordinate.h"
 #include "eval/interpolation.h"
 #include "eval/node_index.h"
@@ -63,23 +64,6 @@ double InputForNode(const LutView& t, int channel, int index) {
     return (bestK >= 0 ? bestK : closestK) / 10.0;
 }
 
-// Cramer's rule for m x = y; a singular matrix leaves y as it is.
-void SolveMatrix(const double (&m)[3][3], const double* y, double* x) {
-    auto det3 = [](double a, double b, double c, double d, double e, double f, double g, double h, double i) {
-        return a * (e * i - f * h) - b * (d * i - f * g) + c * (d * h - e * g);
-    };
-    const double det = det3(m[0][0], m[0][1], m[0][2], m[1][0], m[1][1], m[1][2], m[2][0], m[2][1], m[2][2]);
-    if (std::fabs(det) < 1e-300 || !std::isfinite(det)) {
-        for (int k = 0; k < 3; ++k) x[k] = y[k];
-        return;
-    }
-    x[0] = det3(y[0], m[0][1], m[0][2], y[1], m[1][1], m[1][2], y[2], m[2][1], m[2][2]) / det;
-    x[1] = det3(m[0][0], y[0], m[0][2], m[1][0], y[1], m[1][2], m[2][0], y[2], m[2][2]) / det;
-    x[2] = det3(m[0][0], m[0][1], y[0], m[1][0], m[1][1], y[1], m[2][0], m[2][1], y[2]) / det;
-}
-
-bool SixteenBit(const CProfil& p, int slot) { return p.m_Precision[slot] != 0; }
-
 // Scaled Lab into record fields 0..2, L* x 2.55 unclamped.
 void PutLab(const Lab& lab, double* record) {
     record[0] = lab.L * kLightnessScale;
@@ -92,7 +76,7 @@ void PutLab(const Lab& lab, double* record) {
 double NodeOutput(const CProfil& p, const LutView& t, int slot, int32_t node, int j, bool curves) {
     double v = t.clut[node + j];
     if (curves) v = t.OutputCurveAt(j, v);
-    return SixteenBit(p, slot) ? v * CProfil::kInv257 : v;
+    return p.SixteenBit(slot) ? v * CProfil::kInv257 : v;
 }
 
 uint16_t Store(double value, double bound) {
@@ -124,7 +108,7 @@ void NodePcsValue(CProfil& p, double* record) {
         // Table units back to XYZ on the 0..100 scale, through the inverse of the table's matrix.
         const double y[3] = {x[0] * 257.0 / 327.68, x[1] * 257.0 / 327.68, x[2] * 257.0 / 327.68};
         double xyz[3];
-        SolveMatrix(lut.matrix, y, xyz);
+        SolveMatrix3(lut.matrix, y, xyz);
         PutLab(LabOfTableXyz(p, 1, XYZ{xyz[0] / 100.0, xyz[1] / 100.0, xyz[2] / 100.0}), record);
     } else {
         PutLab(LabOfTableLab(p, 1, x, LabHalf(p, 1)), record);
@@ -148,7 +132,7 @@ int WriteNodeLab(CProfil& p, double* record, int slot) {
     const int32_t node = NodeOffset(t, record + kFirstIndexField, true);
     double v[4] = {0, 0, 0, 0};
     EncodePcs(p, slot, record, -127.5, v);
-    const bool wide = SixteenBit(p, slot);
+    const bool wide = p.SixteenBit(slot);
     const double bound = wide ? 65535.0 : 255.0;
     uint16_t* clut = p.m_Clut[slot].data();
     for (int j = 0; j < t.outputs; ++j) {
@@ -164,7 +148,7 @@ int WriteNodeChannelLab(CProfil& p, double* record, int slot) {
     const LutSlot& lut = p.m_Lut[slot];
     const int32_t node = NodeOffset(t, record + kFirstIndexField, false);
     const int channel = static_cast<int>(record[3]);
-    const bool wide = SixteenBit(p, slot);
+    const bool wide = p.SixteenBit(slot);
     const double bound = wide ? 65535.0 : 255.0;
     uint16_t* clut = p.m_Clut[slot].data();
 
@@ -237,7 +221,7 @@ int WriteNodeDevice(CProfil& p, double* record, bool throughCurves) {
     const LutView t = SlotView(p, 1);
     if (t.inputs < 1) return 1;
     const int32_t node = NodeOffset(t, record + DeviceIndexField(t.inputs), true);
-    const bool wide = SixteenBit(p, 1);
+    const bool wide = p.SixteenBit(1);
     const int32_t bound = wide ? 65535 : 255;
     uint16_t* clut = p.m_Clut[1].data();
     const int outputs = t.outputs < 7 ? t.outputs : 7;

@@ -1,27 +1,26 @@
 #include <cmath>
 #include <cstring>
 
+#include "colour/companding.h"
 #include "icc/icc_bytes.h"
+#include "icc/icc_layout.h"
 #include "icc/profil.h"
 
 namespace vantrel {
 namespace {
 
-// The companding of the white-point Lab; its linear part ends in 0.138, not 16/116.
-double WhiteF(double t) { return t > 0.008856 ? std::pow(t, 1.0 / 3.0) : 7.787 * t + 0.138; }
-
-constexpr size_t kIlluminantAt = 68;
+constexpr size_t kIlluminantAt = icc::Header::kIlluminant;
 
 }  // namespace
 
 void CProfil::SetCmmType(const char* fourChars) {
     if (!fourChars) return;
-    for (int k = 0; k < 4 && fourChars[k]; ++k) m_Header[4 + k] = static_cast<uint8_t>(fourChars[k]);
+    for (int k = 0; k < 4 && fourChars[k]; ++k) m_Header[icc::Header::kCmmType + k] = static_cast<uint8_t>(fourChars[k]);
 }
 
 void CProfil::SetDeviceClass(int kind) {
     const char* name = kind == 0 ? "mntr" : kind == 1 ? "prtr" : kind == 2 ? "scnr" : nullptr;
-    if (name) std::memcpy(m_Header + 12, name, 4);
+    if (name) std::memcpy(m_Header + icc::Header::kDeviceClass, name, 4);
 }
 
 uint32_t CProfil::IlluminantX() const { return LoadU32(m_Header + kIlluminantAt); }
@@ -45,9 +44,9 @@ Lab CProfil::WhiteLab(int direction) const {
     const double* white = m_MediaWhite[direction];
     const double* illuminant = m_Illuminant[direction];
     if (illuminant[0] == 0 || illuminant[1] == 0 || illuminant[2] == 0) return {};
-    const double fx = WhiteF(white[0] / illuminant[0]);
-    const double fy = WhiteF(white[1] / illuminant[1]);
-    const double fz = WhiteF(white[2] / illuminant[2]);
+    const double fx = WhitePointF(white[0] / illuminant[0]);
+    const double fy = WhitePointF(white[1] / illuminant[1]);
+    const double fz = WhitePointF(white[2] / illuminant[2]);
     return {116.0 * fy - 16.0, 500.0 * (fx - fy), 200.0 * (fy - fz)};
 }
 

@@ -2,7 +2,10 @@
 #include <cmath>
 #include <new>
 
+#include "colour/matrix3.h"
+#include "icc/corner_order.h"
 #include "icc/icc_bytes.h"
+#include "icc/icc_layout.h"
 #include "icc/profil.h"
 
 namespace vantrel {
@@ -83,92 +86,90 @@ std::string CutSignature(std::string value) {
     return value;
 }
 
+// True when the kernels can walk a table of these counts.
+bool CountsUsable(const LutSlot& lut) {
+    return (IsLutType(lut.type) || lut.type == "MATR") && lut.inputChannels >= 1 &&
+           lut.inputChannels <= CProfil::kMaxInputs && lut.outputChannels >= 1 &&
+           lut.outputChannels <= CProfil::kMaxOutputs && lut.gridPoints >= kMinGrid && lut.gridPoints <= kMaxGrid &&
+           lut.inputEntries >= kMinEntries && lut.inputEntries <= kMaxEntries && lut.outputEntries >= kMinEntries &&
+           lut.outputEntries <= kMaxEntries && ClutNodes(lut.gridPoints, lut.inputChannels, lut.outputChannels) != 0;
+}
+
+// Reads `channels` "curv" elements of `count` entries each, one after the other from `at`,
+// handing each channel's samples to `store`. False when one is missing or cut short.
+template <typename Store>
+bool ReadCurveElements(const IccBytes& file, uint64_t at, uint64_t channels, uint64_t count,
+                       std::vector<uint16_t>& samples, Store&& store) {
+    for (uint64_t channel = 0; channel < channels; ++channel) {
+        const uint64_t curve = FindCurve(file, at);
+        if (curve == 0 || file.U32(curve + icc::Curve::kCount) != count ||
+            !file.Has(curve + icc::Curve::kEntries, 2 * count))
+            return false;
+        for (uint64_t k = 0; k < count; ++k) samples[k] = file.U16(curve + icc::Curve::kEntries + 2 * k);
+        store(channel);
+        at = curve + icc::Curve::kEntries + 2 * count;
+    }
+    return true;
+}
+
 }  // namespace
 
-int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::string& path) {
-    if (!ValidDirection(direction)) return -1;
-    const int slot = direction;
-    // A table that cannot be held leaves the slot empty, with the white of an empty slot.
-    auto unusable = [&] {
-        ResetSlot(slot);
-        ComputeSlotWhite(direction, slot);
-        return -1;
-    };
-    m_FileInputEntries[slot] = 0;
-    m_LegacyStretch[slot] = LegacyStretch{};
-    m_OutputIdentity[slot] = 0;
-    std::fill(std::begin(m_Eval), std::end(m_Eval), 0.0);
-
+int CProfil::FindTableTag(int direction, const std::string& tag) const {
     const std::vector<TagEntry>& tags = m_Tags[direction];
     auto find = [&tags](const std::string& signature) -> int {
         for (size_t i = 0; i < tags.size(); ++i)
             if (tags[i].signature == signature) return static_cast<int>(i);
         return -1;
     };
-    int found = find(tag);
-    if (found < 0 && tag == "A2B1") found = find("A2B0");
+    const int found = find(tag);
+    // A profile without a colorimetric table serves it from its perceptual one.
+    return found < 0 && tag == "A2B1" ? find("A2B0") : found;
+}
 
+void CProfil::DescribeFromTag(int direction, int index) {
+    const TagEntry& entry = m_Tags[direction][static_cast<size_t>(index)];
+    LutSlot& lut = m_Lut[direction];
+    m_LoadedTag[direction] = index + 1;
+    lut.tagIndex = index + 1;
+    lut.type = entry.type;
+    lut.inputChannels = entry.inputChannels;
+    lut.outputChannels = entry.outputChannels;
+    lut.inputEntries = entry.inputEntries;
+    lut.outputEntries = entry.outputEntries;
+    lut.gridPoints = entry.gridPoints;
+    // The XYZ input matrix is the loaded table's own (a B2A0 may carry one where B2A1 has none);
+    // v4 tables held here have no matrix.
+    const bool v2Lut = entry.type == "mft1" || entry.type == "mft2";
+    for (int k = 0; k < 9; ++k) lut.matrix[k / 3][k % 3] = v2Lut ? entry.matrix[k] : (k % 4 == 0 ? 1.0 : 0.0);
+}
+
+bool CProfil::HasMatrixTrc(int direction) const {
+    const MatrixTrc& trc = m_Trc[direction];
+    return m_Lut[direction].colorantCount == 3 && trc.curve[0].size() == 256 && trc.curve[1].size() == 256 &&
+           trc.curve[2].size() == 256;
+}
+
+bool CProfil::DescribeMatrixTrc(int direction) {
+    LutSlot& lut = m_Lut[direction];
+    m_LoadedTag[direction] = 0;
+    lut.tagIndex = 0;
+    lut.type = "MATR";
+    lut.inputChannels = lut.outputChannels = 3;
+    lut.inputEntries = lut.outputEntries = kHeldEntries;
+    lut.gridPoints = 9;
+    if (direction == 0) return true;
+    // PCS to device runs through the inverse of the colorant matrix.
+    double inverse[3][3];
+    if (!InvertMatrix3(lut.matrix, inverse)) return false;
+    std::copy(&inverse[0][0], &inverse[0][0] + 9, &lut.matrix[0][0]);
+    return true;
+}
+
+void CProfil::ComputeAddressing(int slot) {
     LutSlot& lut = m_Lut[slot];
-    if (found >= 0) {
-        const TagEntry& entry = tags[static_cast<size_t>(found)];
-        m_LoadedTag[direction] = found + 1;
-        lut.tagIndex = found + 1;
-        lut.type = entry.type;
-        lut.inputChannels = entry.inputChannels;
-        lut.outputChannels = entry.outputChannels;
-        lut.inputEntries = entry.inputEntries;
-        lut.outputEntries = entry.outputEntries;
-        lut.gridPoints = entry.gridPoints;
-        // The XYZ input matrix is the loaded table's own (a B2A0 may carry one where B2A1 has
-        // none); v4 tables held here have no matrix.
-        const bool v2Lut = entry.type == "mft1" || entry.type == "mft2";
-        for (int k = 0; k < 9; ++k) lut.matrix[k / 3][k % 3] = v2Lut ? entry.matrix[k] : (k % 4 == 0 ? 1.0 : 0.0);
-    } else if (lut.colorantCount == 3 && m_Trc[slot].curve[0].size() == 256 && m_Trc[slot].curve[1].size() == 256 &&
-               m_Trc[slot].curve[2].size() == 256) {
-        // A matrix/TRC transform needs its three tone curves as well as its three colorants.
-        m_LoadedTag[direction] = 0;
-        lut.tagIndex = 0;
-        lut.type = "MATR";
-        lut.inputChannels = lut.outputChannels = 3;
-        lut.inputEntries = lut.outputEntries = kHeldEntries;
-        lut.gridPoints = 9;
-        if (direction == 1) {
-            // PCS to device runs through the inverse of the colorant matrix.
-            const double(&a)[3][3] = lut.matrix;
-            double inverse[3][3];
-            for (int r = 0; r < 3; ++r)
-                for (int c = 0; c < 3; ++c) {
-                    const int r1 = (c + 1) % 3, r2 = (c + 2) % 3, c1 = (r + 1) % 3, c2 = (r + 2) % 3;
-                    inverse[r][c] = a[r1][c1] * a[r2][c2] - a[r1][c2] * a[r2][c1];
-                }
-            const double det = a[0][0] * inverse[0][0] + a[0][1] * inverse[1][0] + a[0][2] * inverse[2][0];
-            if (!(std::fabs(det) > 0) || !std::isfinite(det)) {
-                ResetSlot(slot);
-                return -1;
-            }
-            for (int r = 0; r < 3; ++r)
-                for (int c = 0; c < 3; ++c) lut.matrix[r][c] = inverse[r][c] / det;
-        }
-    } else {
-        // Nothing of an earlier load may stay behind to be taken for this table.
-        ResetSlot(slot);
-        ComputeSlotWhite(direction, slot);
-        m_Tags[0].clear();
-        m_Tags[1].clear();
-        return -1;
-    }
-
-    // Only tables whose counts the kernels can walk are held.
     const int n = lut.inputChannels;
     const int m = lut.outputChannels;
     const int grid = lut.gridPoints;
-    const uint64_t nodes = ClutNodes(grid, n, m);
-    if ((!IsLutType(lut.type) && lut.type != "MATR") || n < 1 || n > kMaxInputs || m < 1 || m > kMaxOutputs || grid < kMinGrid ||
-        grid > kMaxGrid || lut.inputEntries < kMinEntries || lut.inputEntries > kMaxEntries ||
-        lut.outputEntries < kMinEntries || lut.outputEntries > kMaxEntries || nodes == 0) {
-        return unusable();
-    }
-
     m_Corners[slot] = 1 << n;
     if (lut.inputEntries < kHeldEntries) {
         m_FileInputEntries[slot] = lut.inputEntries;
@@ -177,17 +178,16 @@ int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::strin
     const int entries = lut.inputEntries;
     for (int k = 0; k < kEvalSize; ++k) m_InputStride[slot][k] = k * entries;
 
-    if (lut.type == "mft2" || lut.type == "mAB " || lut.type == "mBA ") {
-        m_Precision[slot] = lut.type == "mft2" ? 1 : 3;
+    m_Precision[slot] = lut.type == "mft2" ? 1 : (lut.type == "mAB " || lut.type == "mBA ") ? 3 : 0;
+    if (SixteenBit(slot)) {
         m_GridScale[slot] = (grid - 1) / 65535.0;
         m_OutputScale[slot] = (lut.outputEntries - 1) / 65535.0;
     } else {
-        m_Precision[slot] = 0;
         m_GridScale[slot] = (grid - 1) / 255.0;
         m_OutputScale[slot] = 1.0;
     }
 
-    // CLUT addressing: the first input varies slowest, the outputs innermost.
+    // The first input varies slowest, the outputs innermost.
     for (int i = 0; i < kMaxInputs; ++i) {
         int32_t multiplier = 0;
         if (i < n) {
@@ -203,49 +203,151 @@ int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::strin
     m_GridPowers[slot][0] = grid * grid;
     m_GridPowers[slot][1] = grid;
     m_GridPowers[slot][2] = 1;
-    // Corners of a cell, by the number of raised channels and then by channel index.
-    {
-        int index = 0;
-        std::vector<int> subset;
-        auto emit = [&](auto&& self, int start, int left) -> void {
-            if (left == 0) {
-                int32_t offset = 0;
-                for (int channel : subset) offset += m_ClutStride[slot][channel];
-                m_CornerOffsets[slot][index++] = offset;
-                return;
-            }
-            for (int channel = start; channel < n; ++channel) {
-                subset.push_back(channel);
-                self(self, channel + 1, left - 1);
-                subset.pop_back();
-            }
-        };
-        for (int raised = 0; raised <= n; ++raised) emit(emit, 0, raised);
-        for (; index < kMaxCorners; ++index) m_CornerOffsets[slot][index] = 0;
+    // The corners of a cell in the kernels' walking order: by the number of raised channels, then
+    // by channel index.
+    for (int k = 0; k < kMaxCorners; ++k) {
+        int32_t offset = 0;
+        if (k < m_Corners[slot]) {
+            const uint8_t raised = CornerOrder::Mask(n, k);
+            for (int channel = 0; channel < n; ++channel)
+                if (raised & (1u << channel)) offset += m_ClutStride[slot][channel];
+        }
+        m_CornerOffsets[slot][k] = offset;
     }
+}
+
+int32_t CProfil::LoadLut(int direction, const std::string& tag, const std::string& path) {
+    if (!ValidDirection(direction)) return -1;
+    const int slot = direction;
+    // A failed load leaves the slot empty, with the white of an empty slot, and says why.
+    auto refuse = [&](int32_t result, std::string why) {
+        ResetSlot(slot);
+        ComputeSlotWhite(direction, slot);
+        m_LoadFailure = std::move(why);
+        return result;
+    };
+    m_FileInputEntries[slot] = 0;
+    m_LegacyStretch[slot] = LegacyStretch{};
+    m_OutputIdentity[slot] = 0;
+    std::fill(std::begin(m_Eval), std::end(m_Eval), 0.0);
+
+    const int found = FindTableTag(direction, tag);
+    if (found >= 0) {
+        DescribeFromTag(direction, found);
+    } else if (HasMatrixTrc(direction)) {
+        if (!DescribeMatrixTrc(direction)) return refuse(-1, "its colorant matrix cannot be inverted");
+    } else {
+        const std::string directory = m_LoadFailure.empty() ? std::string() : " (" + m_LoadFailure + ")";
+        const int32_t result = refuse(-1, "has no \"" + tag + "\" table" + directory);
+        m_Tags[0].clear();
+        m_Tags[1].clear();
+        return result;
+    }
+
+    if (!CountsUsable(m_Lut[slot]))
+        return refuse(-1, "its \"" + tag + "\" table has channel, grid or curve counts this library cannot hold");
+    ComputeAddressing(slot);
 
     IccBytes file;
-    if (!file.Load(path) || !file.Has(0, kHeaderSize)) return unusable();
-    lut.colourSpace = file.Signature(16);
-    lut.pcs = CutSignature(file.Signature(20));
+    if (!file.Load(path) || !file.Has(0, kHeaderSize)) return refuse(-1, "cannot be read");
+    LutSlot& lut = m_Lut[slot];
+    lut.colourSpace = file.Signature(icc::Header::kColourSpace);
+    lut.pcs = CutSignature(file.Signature(icc::Header::kPcs));
 
     const int32_t loaded = LoadTables(slot, file);
-    if (loaded == -2) {
-        ResetSlot(slot);
-        return -2;
-    }
-    if (loaded != 1) return unusable();
+    if (loaded == -2) return refuse(-2, "is too large for the memory left");
+    if (loaded != 1) return refuse(-1, "its \"" + tag + "\" table is cut short or malformed");
 
     if (lut.pcs == "Lab" && lut.colourSpace == "RGB " && lut.type == "MATR") lut.pcs = "XYZ";
     ComputeSlotWhite(direction, slot);
+    m_LoadFailure.clear();
     return 1;
 }
 
 int32_t CProfil::LoadTables(int slot, const IccBytes& file) {
-    LutSlot& lut = m_Lut[slot];
-    if (lut.type == "MATR") return 1;
-    const TagEntry& entry = m_Tags[slot][static_cast<size_t>(lut.tagIndex - 1)];
-    const uint64_t tag = entry.offset;
+    const LutSlot& lut = m_Lut[slot];
+    if (lut.type == "MATR") return 1;  // evaluated through the matrix and the tone curves
+    m_InputCurves[slot].clear();
+    m_Clut[slot].clear();
+    m_OutputCurves[slot].clear();
+    try {
+        const TagEntry& entry = m_Tags[slot][static_cast<size_t>(lut.tagIndex - 1)];
+        if (lut.type == "mft1") return ReadMft1(slot, file, entry.offset);
+        if (lut.type == "mft2") return ReadMft2(slot, file, entry.offset);
+        return ReadLutAB(slot, file, entry.offset);
+    } catch (const std::bad_alloc&) {
+        return -2;
+    }
+}
+
+int32_t CProfil::ReadMft1(int slot, const IccBytes& file, uint64_t tag) {
+    const LutSlot& lut = m_Lut[slot];
+    const uint64_t n = static_cast<uint64_t>(lut.inputChannels);
+    const uint64_t m = static_cast<uint64_t>(lut.outputChannels);
+    const uint64_t clutValues = ClutNodes(lut.gridPoints, lut.inputChannels, lut.outputChannels) * m;
+    const uint64_t curve = icc::Mft1::kCurveEntries;
+    // Input curves, CLUT and output curves, one byte per value.
+    const uint64_t start = tag + icc::Mft1::kTables;
+    if (!file.Has(start, n * curve + clutValues + m * curve)) return -1;
+    m_InputCurves[slot].resize(n * curve);
+    m_Clut[slot].resize(clutValues);
+    m_OutputCurves[slot].resize(m * curve);
+    uint64_t at = start;
+    for (auto* table : {&m_InputCurves[slot], &m_Clut[slot], &m_OutputCurves[slot]})
+        for (uint16_t& value : *table) value = file.U8(at++);
+    return 1;
+}
+
+int32_t CProfil::ReadMft2(int slot, const IccBytes& file, uint64_t tag) {
+    const LutSlot& lut = m_Lut[slot];
+    const uint64_t n = static_cast<uint64_t>(lut.inputChannels);
+    const uint64_t m = static_cast<uint64_t>(lut.outputChannels);
+    const uint64_t held = static_cast<uint64_t>(lut.inputEntries);
+    const uint64_t fileEntries = static_cast<uint64_t>(InputEntriesInFile(slot));
+    const uint64_t outEntries = static_cast<uint64_t>(lut.outputEntries);
+    const uint64_t clutValues = ClutNodes(lut.gridPoints, lut.inputChannels, lut.outputChannels) * m;
+    std::vector<uint16_t>& input = m_InputCurves[slot];
+    std::vector<uint16_t>& clut = m_Clut[slot];
+    std::vector<uint16_t>& output = m_OutputCurves[slot];
+
+    // The three tables as 16-bit values.
+    const uint64_t start = tag + icc::Mft2::kTables;
+    if (!file.Has(start, 2 * (n * fileEntries + clutValues + m * outEntries))) return -1;
+    input.resize(n * held);
+    clut.resize(clutValues);
+    output.resize(m * outEntries);
+    uint64_t at = start;
+    auto next = [&file, &at] {
+        const uint16_t value = file.U16(at);
+        at += 2;
+        return value;
+    };
+    std::vector<uint16_t> samples(fileEntries);
+    for (uint64_t channel = 0; channel < n; ++channel) {
+        for (uint16_t& value : samples) value = next();
+        uint16_t* curve = input.data() + channel * held;
+        HoldInputCurve(samples, fileEntries, held, curve);
+        if (fileEntries >= held && curve[held - 1] == kLegacyWhite) StretchLegacy(curve, held, 1);
+    }
+    for (uint16_t& value : clut) value = next();
+    for (uint16_t& value : output) value = next();
+    for (uint64_t channel = 0; channel < m; ++channel) {
+        uint16_t* curve = output.data() + channel * outEntries;
+        if (curve[outEntries - 1] == kLegacyWhite) StretchLegacy(curve, outEntries, 1);
+    }
+    if (m >= 3 && clut[0] == kLegacyWhite && clut[1] == 0x8000 && clut[2] == 0x8000) {
+        LegacyStretch& stretch = m_LegacyStretch[slot];
+        stretch.clut = true;
+        for (uint64_t k = 0; k < clut.size(); k += m)
+            if (clut[k] > kLegacyWhite) stretch.clipped.emplace_back(static_cast<uint32_t>(k), clut[k]);
+        StretchLegacy(clut.data(), clut.size(), m);
+    }
+    MarkIdentityOutput(slot);
+    return 1;
+}
+
+int32_t CProfil::ReadLutAB(int slot, const IccBytes& file, uint64_t tag) {
+    const LutSlot& lut = m_Lut[slot];
     const uint64_t n = static_cast<uint64_t>(lut.inputChannels);
     const uint64_t m = static_cast<uint64_t>(lut.outputChannels);
     const uint64_t held = static_cast<uint64_t>(lut.inputEntries);
@@ -253,103 +355,33 @@ int32_t CProfil::LoadTables(int slot, const IccBytes& file) {
     const uint64_t outEntries = static_cast<uint64_t>(lut.outputEntries);
     const uint64_t clutValues = ClutNodes(lut.gridPoints, lut.inputChannels, lut.outputChannels) * m;
 
+    // Curve elements on both sides of a 16-bit CLUT.
+    const bool aToB = lut.type == "mAB ";
+    const uint64_t inputSide = tag + file.U32(tag + icc::LutAB::InputCurves(aToB));
+    const uint64_t outputSide = tag + file.U32(tag + icc::LutAB::OutputCurves(aToB));
+    const uint64_t clutHead = tag + file.U32(tag + icc::LutAB::kClut);
+    const uint64_t clutAt = clutHead + icc::ClutHead::kValues;
+    if (!V4ClutHeadMatches(file, clutHead, lut.inputChannels, lut.gridPoints) || !file.Has(clutAt, 2 * clutValues))
+        return -1;
+
     std::vector<uint16_t>& input = m_InputCurves[slot];
-    std::vector<uint16_t>& clut = m_Clut[slot];
     std::vector<uint16_t>& output = m_OutputCurves[slot];
-    input.clear();
-    clut.clear();
-    output.clear();
-    try {
-        if (lut.type == "mft1") {
-            // Input curves, CLUT and output curves, one byte per value, from byte 48.
-            const uint64_t start = tag + 48;
-            if (!file.Has(start, n * 256 + clutValues + m * 256)) return -1;
-            input.resize(n * 256);
-            clut.resize(clutValues);
-            output.resize(m * 256);
-            uint64_t at = start;
-            for (auto* table : {&input, &clut, &output})
-                for (uint16_t& value : *table) value = file.U8(at++);
-            return 1;
-        }
-
-        if (lut.type == "mft2") {
-            // The same three tables as 16-bit values from byte 52.
-            const uint64_t start = tag + 52;
-            if (!file.Has(start, 2 * (n * fileEntries + clutValues + m * outEntries))) return -1;
-            input.resize(n * held);
-            clut.resize(clutValues);
-            output.resize(m * outEntries);
-            uint64_t at = start;
-            auto next = [&file, &at] {
-                const uint16_t value = file.U16(at);
-                at += 2;
-                return value;
-            };
-            std::vector<uint16_t> samples(fileEntries);
-            for (uint64_t channel = 0; channel < n; ++channel) {
-                for (uint16_t& value : samples) value = next();
-                uint16_t* curve = input.data() + channel * held;
-                HoldInputCurve(samples, fileEntries, held, curve);
-                if (fileEntries >= held && curve[held - 1] == kLegacyWhite) StretchLegacy(curve, held, 1);
-            }
-            for (uint16_t& value : clut) value = next();
-            for (uint16_t& value : output) value = next();
-            for (uint64_t channel = 0; channel < m; ++channel) {
-                uint16_t* curve = output.data() + channel * outEntries;
-                if (curve[outEntries - 1] == kLegacyWhite) StretchLegacy(curve, outEntries, 1);
-            }
-            if (m >= 3 && clut[0] == kLegacyWhite && clut[1] == 0x8000 && clut[2] == 0x8000) {
-                LegacyStretch& stretch = m_LegacyStretch[slot];
-                stretch.clut = true;
-                for (uint64_t k = 0; k < clut.size(); k += m)
-                    if (clut[k] > kLegacyWhite) stretch.clipped.emplace_back(static_cast<uint32_t>(k), clut[k]);
-                StretchLegacy(clut.data(), clut.size(), m);
-            }
-            MarkIdentityOutput(slot);
-            return 1;
-        }
-
-        // "mAB " / "mBA ": curve elements on both sides of a 16-bit CLUT.
-        const bool ab = lut.type == "mAB ";
-        const uint64_t inputSide = tag + file.U32(tag + (ab ? 28 : 12));
-        const uint64_t outputSide = tag + file.U32(tag + (ab ? 12 : 28));
-        const uint64_t clutAt = tag + file.U32(tag + 24);
-        if (!V4ClutHeadMatches(file, clutAt, lut.inputChannels, lut.gridPoints) ||
-            !file.Has(clutAt + 20, 2 * clutValues))
-            return -1;
-
-        // Reads `channels` curves of `count` entries each from `at`, handing each to `store`.
-        auto readCurves = [&file](uint64_t at, uint64_t channels, uint64_t count, std::vector<uint16_t>& samples,
-                                  auto&& store) -> bool {
-            for (uint64_t channel = 0; channel < channels; ++channel) {
-                const uint64_t curve = FindCurve(file, at);
-                if (curve == 0 || file.U32(curve + 8) != count || !file.Has(curve + 12, 2 * count)) return false;
-                for (uint64_t k = 0; k < count; ++k) samples[k] = file.U16(curve + 12 + 2 * k);
-                store(channel);
-                at = curve + 12 + 2 * count;
-            }
-            return true;
-        };
-        input.resize(n * held);
-        clut.resize(clutValues);
-        output.resize(m * outEntries);
-        std::vector<uint16_t> samples(std::max(fileEntries, outEntries));
-        const bool inputsRead = readCurves(inputSide, n, fileEntries, samples, [&](uint64_t channel) {
-            HoldInputCurve(samples, fileEntries, held, input.data() + channel * held);
-        });
-        if (!inputsRead) return -1;
-        for (uint64_t k = 0; k < clutValues; ++k) clut[k] = file.U16(clutAt + 20 + 2 * k);
-        const bool outputsRead = readCurves(outputSide, m, outEntries, samples, [&](uint64_t channel) {
-            std::copy(samples.begin(), samples.begin() + static_cast<std::ptrdiff_t>(outEntries),
-                      output.data() + channel * outEntries);
-        });
-        if (!outputsRead) return -1;
-        MarkIdentityOutput(slot);
-        return 1;
-    } catch (const std::bad_alloc&) {
-        return -2;
-    }
+    input.resize(n * held);
+    m_Clut[slot].resize(clutValues);
+    output.resize(m * outEntries);
+    std::vector<uint16_t> samples(std::max(fileEntries, outEntries));
+    const bool inputsRead = ReadCurveElements(file, inputSide, n, fileEntries, samples, [&](uint64_t channel) {
+        HoldInputCurve(samples, fileEntries, held, input.data() + channel * held);
+    });
+    if (!inputsRead) return -1;
+    for (uint64_t k = 0; k < clutValues; ++k) m_Clut[slot][k] = file.U16(clutAt + 2 * k);
+    const bool outputsRead = ReadCurveElements(file, outputSide, m, outEntries, samples, [&](uint64_t channel) {
+        std::copy(samples.begin(), samples.begin() + static_cast<std::ptrdiff_t>(outEntries),
+                  output.data() + channel * outEntries);
+    });
+    if (!outputsRead) return -1;
+    MarkIdentityOutput(slot);
+    return 1;
 }
 
 void CProfil::MarkIdentityOutput(int slot) {

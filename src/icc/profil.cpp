@@ -3,17 +3,18 @@
 #include <cstring>
 
 #include "icc/icc_bytes.h"
+#include "icc/icc_layout.h"
 
 namespace vantrel {
 
 CProfil::CProfil() {
     // A profile that has read nothing describes a D50 printer profile.
-    std::memcpy(m_Header + 4, "appl", 4);
-    std::memcpy(m_Header + 12, "prtr", 4);
-    std::memcpy(m_Header + 36, "acsp", 4);
-    StoreU32(m_Header + 68, 63188);
-    StoreU32(m_Header + 72, 65535);
-    StoreU32(m_Header + 76, 54059);
+    std::memcpy(m_Header + icc::Header::kCmmType, "appl", 4);
+    std::memcpy(m_Header + icc::Header::kDeviceClass, "prtr", 4);
+    std::memcpy(m_Header + icc::Header::kSignature, "acsp", 4);
+    StoreU32(m_Header + icc::Header::kIlluminant, 63188);
+    StoreU32(m_Header + icc::Header::kIlluminant + 4, 65535);
+    StoreU32(m_Header + icc::Header::kIlluminant + 8, 54059);
 }
 
 void CProfil::Release() {

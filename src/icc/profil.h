@@ -96,7 +96,14 @@ public:
 
     // ---- lifecycle -----------------------------------------------------------------------------
     void MarkReleased() { m_Precision[0] = kReleasedMarker; }
+    // False from the release until the next LoadLut of direction 0.
     bool HoldsTables() const { return m_Precision[0] != kReleasedMarker; }
+    // True when the slot holds a 16-bit table ("mft2", "mAB ", "mBA "); 8-bit tables ("mft1"),
+    // matrix/TRC transforms and a released profile are not. The one answer to that question: the
+    // precision field also carries the release marker.
+    bool SixteenBit(int slot) const {
+        return (slot == 0 || slot == 1) && (m_Precision[slot] == 1 || m_Precision[slot] == 3);
+    }
     // Frees all tables and both directories and stores the release marker; harmless when released.
     void Release();
     // True when the slot holds a complete transform (tables of the sizes its descriptor gives, or "MATR").
@@ -235,6 +242,10 @@ public:
 
     LutSlot m_Lut[kSlots];
 
+    // Why the last ReadTagTable or LoadLut refused the file, in words for the user ("has no
+    // \"B2A1\" table"); empty after a successful load. Composed here, shown by whoever asks.
+    std::string m_LoadFailure;
+
     // Table precision per slot: 0 8-bit ("mft1", "MATR"), 1 "mft2", 3 "mAB "/"mBA ".
     // Slot 0 doubles as the release marker (kReleasedMarker).
     int32_t m_Precision[2] = {0, 0};
@@ -247,9 +258,22 @@ public:
 private:
     static bool ValidDirection(int direction) { return direction == 0 || direction == 1; }
     void SetSlotWhite(int direction, int index, double value);
+    // Reading the directory (profile_reader.cpp): one tag, and the parts of it that describe a table.
     bool ReadTag(const IccBytes& file, int direction, uint32_t index, int& colorants);
+    bool ReadLutHead(const IccBytes& file, int direction, TagEntry& entry);
+    bool ReadColorant(const IccBytes& file, int direction, TagEntry& entry, int channel);
+    bool ReadToneCurve(const IccBytes& file, int direction, const TagEntry& entry, int channel);
+    // Loading a table (lut_loader.cpp), step by step.
+    int FindTableTag(int direction, const std::string& tag) const;
+    void DescribeFromTag(int direction, int index);
+    bool HasMatrixTrc(int direction) const;
+    bool DescribeMatrixTrc(int direction);
+    void ComputeAddressing(int slot);
     void ResetSlot(int slot);
     int32_t LoadTables(int slot, const IccBytes& file);
+    int32_t ReadMft1(int slot, const IccBytes& file, uint64_t tag);
+    int32_t ReadMft2(int slot, const IccBytes& file, uint64_t tag);
+    int32_t ReadLutAB(int slot, const IccBytes& file, uint64_t tag);
     void MarkIdentityOutput(int slot);
     void MediaWhiteFromSlotWhite(int direction);
     void ComputeSlotWhite(int direction, int slot);

@@ -2,6 +2,7 @@
 #include <cstring>
 
 #include "icc/icc_bytes.h"
+#include "icc/icc_layout.h"
 #include "icc/profil.h"
 #include "support/cfile.h"
 
@@ -34,14 +35,16 @@ uint64_t LoadedClutPosition(const CProfil& p, int direction, const IccBytes& fil
         static_cast<size_t>(lut.tagIndex) > tags.size())
         return 0;
     const TagEntry& entry = tags[static_cast<size_t>(lut.tagIndex - 1)];
-    const uint64_t record = CProfil::kHeaderSize + 12 * uint64_t(lut.tagIndex - 1);
-    if (!file.Has(0, CProfil::kHeaderSize) || file.U32(128) < static_cast<uint32_t>(lut.tagIndex) ||
-        !file.Has(record, 12) || file.Signature(record) != entry.signature || file.U32(record + 4) != entry.offset ||
-        file.U32(record + 8) != entry.size)
+    const uint64_t record = icc::TagRecord::At(static_cast<uint64_t>(lut.tagIndex - 1));
+    if (!file.Has(0, icc::Header::kSize) || file.U32(icc::Header::kTagCount) < static_cast<uint32_t>(lut.tagIndex) ||
+        !file.Has(record, icc::TagRecord::kSize) || file.Signature(record + icc::TagRecord::kSignature) != entry.signature ||
+        file.U32(record + icc::TagRecord::kOffset) != entry.offset ||
+        file.U32(record + icc::TagRecord::kDataSize) != entry.size)
         return 0;
     const uint64_t tag = entry.offset;
-    if (!file.Has(tag, entry.size) || !file.Has(tag, 32) || file.Signature(tag) != lut.type || file.U8(tag + 8) != lut.inputChannels ||
-        file.U8(tag + 9) != lut.outputChannels)
+    if (!file.Has(tag, entry.size) || !file.Has(tag, icc::LutAB::kHeadSize) ||
+        file.Signature(tag + icc::TagData::kType) != lut.type || file.U8(tag + icc::LutHead::kInputs) != lut.inputChannels ||
+        file.U8(tag + icc::LutHead::kOutputs) != lut.outputChannels)
         return 0;
 
     const uint64_t n = static_cast<uint64_t>(lut.inputChannels);
@@ -49,20 +52,20 @@ uint64_t LoadedClutPosition(const CProfil& p, int direction, const IccBytes& fil
     uint64_t clut = 0;
     uint64_t width = 2;
     if (lut.type == "mft1") {
-        if (file.U8(tag + 10) != lut.gridPoints) return 0;
-        clut = tag + 48 + n * 256;
+        if (file.U8(tag + icc::LutHead::kGrid) != lut.gridPoints) return 0;
+        clut = tag + icc::Mft1::kTables + n * icc::Mft1::kCurveEntries;
         width = 1;
     } else if (lut.type == "mft2") {
+        // The CLUT follows the input curves as the file holds them, not as they are held here.
         const uint64_t entries = static_cast<uint64_t>(p.InputEntriesInFile(slot));
-        if (file.U8(tag + 10) != lut.gridPoints || file.U16(tag + 48) != entries ||
-            file.U16(tag + 50) != static_cast<uint64_t>(lut.outputEntries))
+        if (file.U8(tag + icc::LutHead::kGrid) != lut.gridPoints || file.U16(tag + icc::Mft2::kInputEntries) != entries ||
+            file.U16(tag + icc::Mft2::kOutputEntries) != static_cast<uint64_t>(lut.outputEntries))
             return 0;
-        clut = tag + 52 + n * entries * 2;
+        clut = tag + icc::Mft2::kTables + n * entries * 2;
     } else {
-        // mAB / mBA: the values follow the 20-byte CLUT head.
-        const uint64_t head = tag + file.U32(tag + 24);
+        const uint64_t head = tag + file.U32(tag + icc::LutAB::kClut);
         if (!V4ClutHeadMatches(file, head, lut.inputChannels, lut.gridPoints)) return 0;
-        clut = head + 20;
+        clut = head + icc::ClutHead::kValues;
     }
     return file.Has(clut, values * width) ? clut : 0;
 }

@@ -3,14 +3,9 @@
 
 #include "icc/profil.h"
 #include "icc/table_white.h"
+#include "support/rounding.h"
 
 namespace vantrel {
-namespace {
-
-// Adds 0.5 and truncates toward zero, as every rounding of the library does.
-int RoundHalfUp(double value) { return static_cast<int>(value + 0.5); }
-
-}  // namespace
 
 void CProfil::ComputeSlotWhite(int direction, int slot) {
     double* white = m_SlotWhite[slot];
@@ -39,14 +34,16 @@ void CProfil::ComputeSlotWhite(int direction, int slot) {
     white[1] = lab.a;
     white[2] = lab.b;
     if (direction == 0) {
-        m_PaperWhite[0][0] = static_cast<int16_t>(RoundHalfUp(lab.L * 2.55));
+        m_PaperWhite[0][0] = static_cast<int16_t>(RoundHalfUp(lab.L * kLightnessScale));
         m_PaperWhite[0][1] = static_cast<int16_t>(RoundHalfUp(lab.a));
         m_PaperWhite[0][2] = static_cast<int16_t>(RoundHalfUp(lab.b));
         return;
     }
 
     // The device values of the paper white: the PCS white (in table units) through the table.
-    const double half = m_Precision[0] == 0 ? 128.0 : 127.5;
+    // The encoding follows the direction-0 table; without one, the table's own.
+    const bool sixteenBit = SlotHolds(0) ? SixteenBit(0) : SixteenBit(slot);
+    const double half = sixteenBit ? 127.5 : 128.0;
     m_Eval[0] = 255.0;
     m_Eval[1] = half;
     m_Eval[2] = half;
@@ -54,7 +51,7 @@ void CProfil::ComputeSlotWhite(int direction, int slot) {
     const int channels = m_Lut[slot].outputChannels;
     for (int k = 0; k < channels && k < 20; ++k) {
         double value = m_Eval[k];
-        if (m_Precision[slot] != 0) value /= 257.0;
+        if (SixteenBit(slot)) value /= 257.0;
         m_PaperWhite[1][k] = static_cast<int16_t>(RoundHalfUp(value));
     }
 }

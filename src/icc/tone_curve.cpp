@@ -5,6 +5,7 @@
 
 #include "icc/profil.h"
 #include "icc/spline.h"
+#include "support/rounding.h"
 
 namespace vantrel {
 namespace {
@@ -12,7 +13,6 @@ namespace {
 constexpr int kPositions = NaturalSpline::kGridPositions;  // the working grid: value x 16
 constexpr int kLastPosition = kPositions - 1;
 
-int RoundHalfUp(double value) { return static_cast<int>(value + 0.5); }
 
 // A natural spline through `count` samples spread evenly over the working grid, their values
 // divided by 257 and multiplied by `scale`, evaluated at every grid position.

@@ -28,6 +28,8 @@ std::pair<int, int> Load(const std::string& path, const char* a2b = "A2B1", cons
     // Whatever happened, a slot holds a whole table exactly when it was loaded.
     EXPECT_EQ(p.SlotHolds(0), forward == 1);
     EXPECT_EQ(p.SlotHolds(1), backward == 1);
+    // A refusal says why; a load that succeeds leaves no reason behind.
+    EXPECT_EQ(p.m_LoadFailure.empty(), backward == 1) << p.m_LoadFailure;
     return {forward, backward};
 }
 
@@ -124,6 +126,29 @@ TEST(MalformedProfiles, VariantsFailCleanly) {
             EXPECT_EQ(Load(path), v.expected) << v.what;
     }
     EXPECT_EQ(Load(dir.File("missing.icc")), bothFail);
+}
+
+TEST(MalformedProfiles, TheReasonNamesWhatWasWrong) {
+    TempDir dir;
+    ASSERT_TRUE(WriteLcmsV4Profile(dir.File("v4.icc")));
+    Bytes matrixBased = ReadFile(dir.File("v4.icc"));
+    Put(matrixBased, TagOffset(matrixBased, Record(matrixBased, "A2B0")) + 16, 32, 4);
+    const std::string path = WriteFile(dir.File("matrix.icc"), matrixBased);
+    const struct {
+        std::string path;
+        const char* tag;
+        const char* reason;
+    } cases[] = {
+        {dir.File("missing.icc"), "A2B1", "has no \"A2B1\" table (cannot be read as an ICC profile)"},
+        {path, "A2B0", "has no \"A2B0\" table (Wrong Type of ICC4 Profile (Matrix based) !)"},
+        {dir.File("v4.icc"), "B2A1", "has no \"B2A1\" table"},
+    };
+    for (const auto& c : cases) {
+        CProfil p;
+        p.ReadTagTable(0, c.path);
+        EXPECT_EQ(p.LoadLut(0, c.tag, c.path), -1);
+        EXPECT_EQ(p.m_LoadFailure, c.reason);
+    }
 }
 
 // Real profiles cut at every few hundred bytes and with random bytes in the tag table and the

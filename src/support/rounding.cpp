@@ -1,0 +1,15 @@
+#include "support/rounding.h"
+
+#include <cmath>
+#include <limits>
+
+namespace vantrel {
+
+int TruncatedInt(double value) {
+    if (std::isnan(value)) return 0;
+    if (value >= static_cast<double>(std::numeric_limits<int>::max())) return std::numeric_limits<int>::max();
+    if (value <= static_cast<double>(std::numeric_limits<int>::min())) return std::numeric_limits<int>::min();
+    return static_cast<int>(value);
+}
+
+}  // namespace vantrel
