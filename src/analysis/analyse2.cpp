@@ -43,9 +43,9 @@ void CIterativtoolDlg::IsdAnalysis() {
     for (int i = 0; i < n; ++i) {
         PatchRecord& record = records[static_cast<std::size_t>(i)];
         const Lab measured = PatchLab(*m_MeasIT8, i, fromXyz);
-        double values[CProfil::kEvalSize] = {measured.L * 2.55, measured.a, measured.b};
+        double values[CProfil::kEvalSize] = {measured.L * kLightnessScale, measured.a, measured.b};
         LabThroughTable(*m_ISDprof, values, 1);
-        const Lab converted{values[0] / 2.55, values[1], values[2]};
+        const Lab converted{values[0] / kLightnessScale, values[1], values[2]};
 
         record.sampleNumber = static_cast<uint32_t>(i + 1);
         for (int c = 0; c < 4; ++c) record.device[c] = WholePercent(m_MeasIT8->GetCmyk(i, c));

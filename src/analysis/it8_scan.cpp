@@ -3,6 +3,7 @@
 #include <cmath>
 
 #include "analysis/it8_kind.h"
+#include "colour/companding.h"
 #include "interface/tool_object.h"
 
 namespace vantrel {
@@ -42,7 +43,6 @@ bool IsWhite(const Measured_IT8& it8, const It8Kind& kind, int patch) {
     return MatchesTarget(it8, kind, patch, kind.device == It8Kind::kRgb ? kFullRgb : kNoInk);
 }
 
-double CieCubeRoot(double r) { return r > 0.008856 ? std::pow(r, 1.0 / 3.0) : 7.787 * r + 16.0 / 116.0; }
 
 }  // namespace
 
@@ -104,9 +104,9 @@ Lab CIterativtoolDlg::MeasuredXyzToLab(double X, double Y, double Z) const {
         if (profile && profile->HoldsTables()) return profile->XYZToLab(X, Y, Z);
     }
     // No profile loaded: D50 and the plain CIE formula.
-    const double fx = CieCubeRoot(X / 0.9642);
-    const double fy = CieCubeRoot(Y / 1.0);
-    const double fz = CieCubeRoot(Z / 0.8249);
+    const double fx = CieFExact(X / kD50White[0]);
+    const double fy = CieFExact(Y / kD50White[1]);
+    const double fz = CieFExact(Z / kD50White[2]);
     return Lab{116.0 * fy - 16.0, 500.0 * (fx - fy), 200.0 * (fy - fz)};
 }
 

@@ -161,7 +161,7 @@ private:
         for (int i = 0; i <= 100; ++i)
             for (int k = 0; k < 90; ++k)
                 for (int c = 0; c < kMaxChroma; ++c) {
-                    const LCh r = RoundTripLch(2.55 * i, c, 4.0 * k);
+                    const LCh r = RoundTripLch(kLightnessScale * i, c, 4.0 * k);
                     Note(Bin(r.h, kHueBin), Bin(r.L, kLightnessBin), r);
                 }
     }

@@ -15,7 +15,7 @@ int ConvertDeviceRecords(CIterativtoolDlg& tool, const char* profile, int count,
     CProfil& ref = *tool.m_Refprof;
 
     const int channels = kind == DeviceRecord::Cmyk ? 4 : kind == DeviceRecord::Rgb ? 3 : 7;
-    const double scale = kind == DeviceRecord::Rgb ? 1.0 : 2.55;
+    const double scale = kind == DeviceRecord::Rgb ? 1.0 : kPercentToDevice;
     for (int i = 0; i < count; ++i) {
         // Twenty entries: the multi-colourant evaluation reads them all.
         double values[CProfil::kEvalSize] = {};
@@ -25,7 +25,7 @@ int ConvertDeviceRecords(CIterativtoolDlg& tool, const char* profile, int count,
             case DeviceRecord::Rgb: RgbToLab(ref, values); break;
             case DeviceRecord::Cmykrgb: MultiToLab(ref, values); break;
         }
-        const double L = values[0] / 2.55;
+        const double L = values[0] / kLightnessScale;
         lab[3 * i] = ToHostInt(L);
         lab[3 * i + 1] = ToHostInt(values[1]);
         lab[3 * i + 2] = ToHostInt(values[2]);

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "it8/cgats_number.h"
+#include "support/rounding.h"
 
 namespace vantrel {
 

@@ -3,7 +3,7 @@
 #include <cmath>
 #include <cstdio>
 
-#include "it8/cgats_number.h"
+#include "support/rounding.h"
 
 namespace vantrel {
 namespace {

@@ -91,8 +91,7 @@ XYZ CIterativtoolDlg::LabToXYZ(double L, double a, double b) const {
         }
     }
     // No profile loaded: the same formula against D50.
-    static constexpr double kD50[3] = {0.9642, 1.0, 0.8249};
-    const XYZ xyz = LabToXYZAgainst({L, a, b}, kD50);
+    const XYZ xyz = LabToXYZAgainst({L, a, b}, kD50White);
     return {xyz.X * 100, xyz.Y * 100, xyz.Z * 100};
 }
 

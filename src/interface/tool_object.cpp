@@ -57,7 +57,7 @@ void CIterativtoolDlg::WriteEmbeddedProfiles() {
     platform::ModuleResources module;
     if (!module.IsOpen()) return;
     for (const IdentityProfileInfo& info : IdentityProfiles()) {
-        const std::vector<uint8_t> bytes = module.Profile(info.id);
+        const std::vector<uint8_t> bytes = EmbeddedIdentityProfile(module, info.id);
         if (bytes.empty()) continue;
         CFile file(m_WorkDir + info.fileName, CFile::kBinary | CFile::kWrite);
         if (file.IsOpen()) file.Write(bytes.data(), bytes.size());

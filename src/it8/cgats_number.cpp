@@ -74,11 +74,4 @@ int32_t LeadingInt(std::string_view text) {
     return static_cast<int32_t>(value);
 }
 
-int TruncatedInt(double value) {
-    if (std::isnan(value)) return 0;
-    if (value >= static_cast<double>(std::numeric_limits<int>::max())) return std::numeric_limits<int>::max();
-    if (value <= static_cast<double>(std::numeric_limits<int>::min())) return std::numeric_limits<int>::min();
-    return static_cast<int>(value);
-}
-
 }  // namespace vantrel

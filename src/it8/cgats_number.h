@@ -14,7 +14,4 @@ double LeadingDouble(std::string_view text);
 // Values beyond the 32-bit range keep its ends.
 int32_t LeadingInt(std::string_view text);
 
-// A value truncated toward zero to an int; values beyond the int range keep its ends, NaN is 0.
-int TruncatedInt(double value);
-
 }  // namespace vantrel

@@ -4,10 +4,11 @@
 #include <fstream>
 #include <iomanip>
 
-#include "it8/cgats_number.h"
+#include "colour/colour_values.h"
 #include "it8/color_ctrl_errors.h"
 #include "it8/measured_it8.h"
 #include "it8/number_locale.h"
+#include "support/rounding.h"
 
 namespace vantrel {
 namespace {
@@ -56,7 +57,7 @@ void WriteRow(std::ostream& out, uint32_t layoutKind, const PatchRecord& record,
     for (uint32_t c = 0; c < layoutKind; ++c) {
         // RGB percentages, inverted onto 0..255 (100 % is 0).
         if (layoutKind == 3 && percentRgb)
-            out << '\t' << 255 - TruncatedInt(record.device[c] * 2.55);
+            out << '\t' << 255 - TruncatedInt(record.device[c] * kPercentToDevice);
         else
             out << '\t' << record.device[c];
     }

@@ -4,6 +4,8 @@
 #include <string>
 #include <vector>
 
+#include "support/platform.h"
+
 namespace vantrel {
 
 struct IdentityProfileInfo {
@@ -16,5 +18,9 @@ const std::vector<IdentityProfileInfo>& IdentityProfiles();
 
 // The bytes of the identity profile with resource id `id` (102..105); empty for another id.
 std::vector<uint8_t> BuildIdentityProfile(int id);
+
+// The bytes of an embedded identity profile: the module's resource where the library's file
+// carries them, else built here. Empty when the module is not open or the resource is missing.
+std::vector<uint8_t> EmbeddedIdentityProfile(const platform::ModuleResources& module, int id);
 
 }  // namespace vantrel

@@ -16,6 +16,15 @@ const char* IsdProfilePath();
 // '.' when they cannot be read.
 char UserDecimalPoint();
 
+// True where the library's own file carries the identity profiles as resources (Windows); a
+// shared object has no resource section, and the profiles are built by the code that makes those
+// resources.
+#if defined(_WIN32)
+constexpr bool kProfilesInModule = true;
+#else
+constexpr bool kProfilesInModule = false;
+#endif
+
 // Resource ids of the embedded identity profiles.
 constexpr int kNeutral3ccId = 102;
 constexpr int kCmykLinkId = 103;
@@ -31,7 +40,8 @@ public:
     ModuleResources& operator=(const ModuleResources&) = delete;
 
     bool IsOpen() const { return module_ != nullptr; }
-    // The bytes of one embedded profile; empty when the resource is missing.
+    // The bytes of one embedded profile; empty when the resource is missing (always, where
+    // kProfilesInModule is false).
     std::vector<uint8_t> Profile(int id) const;
 
 private:

@@ -5,8 +5,6 @@
 #include <locale>
 #include <stdexcept>
 
-#include "resources/identity_profiles.h"
-
 namespace vantrel::platform {
 
 const char* ParameterFilePath() { return "/tmp/vantrelparams.txt"; }
@@ -21,15 +19,11 @@ char UserDecimalPoint() {
     }
 }
 
-// A shared object carries no resource section: the profiles are generated from
-// the same code that produces the Windows resources at build time.
+// A shared object carries no resource section: there is nothing to open or read.
 ModuleResources::ModuleResources() : module_(this) {}
 ModuleResources::~ModuleResources() = default;
 
-std::vector<uint8_t> ModuleResources::Profile(int id) const {
-    if (!module_) return {};
-    return BuildIdentityProfile(id);
-}
+std::vector<uint8_t> ModuleResources::Profile(int) const { return {}; }
 
 }  // namespace vantrel::platform
 
