@@ -19,7 +19,7 @@ double ErrorOf(CProfil& profile, const double* target, const double* device) {
         CmykToLab(profile, values);
     else
         MultiToLab(profile, values);
-    return DeltaE(values[0] / 2.55, values[1], values[2], target[0], target[1], target[2]);
+    return DeltaE(values[0] / kLightnessScale, values[1], values[2], target[0], target[1], target[2]);
 }
 
 void ZeroBelowOne(double* device) {
@@ -75,8 +75,14 @@ void Analyse1Search(CProfil& profile, const double* target, const double* start,
         int n = InksInUse(cand);
         if (n == 0) break;
         if (pass * 0.15 < best || pass < n) {
-            ConstrainedGridSearch(profile, target, cand, 0, 255, best, StepOfPass(pass), pass, free, lightnessRule,
-                                  found);
+            GridSearchRequest request;
+            request.target = target;
+            request.start = cand;
+            request.step = StepOfPass(pass);
+            request.limit = pass;  // pass p lets p inks print together
+            request.flags = free;
+            request.lightnessRule = lightnessRule;
+            ConstrainedGridSearch(profile, request, best, found);
             KeepBetter(found, cand, cur, err, best);
             if (pass * 0.2 < best) {
                 n = 0;

@@ -131,22 +131,23 @@ private:
 
 }  // namespace
 
-void ConstrainedGridSearch(CProfil& p, const double* target, const double* start, double blackLow, double blackHigh,
-                           double& bestDelta, double step, int limit, const int* flags, bool lightnessRule,
-                           double* best) {
+void ConstrainedGridSearch(CProfil& p, const GridSearchRequest& r, double& bestDelta, double* best) {
+    const double* target = r.target;
+    const double* start = r.start;
+    const int* flags = r.flags;
     const int inputs = InputChannels(p);
     Forward forward(p, inputs);
     const Lab s = forward(start, kChannels);
-    Acceptance rule{target, s, bestDelta, s, s.L < kDarkLightness, lightnessRule, bestDelta};
+    Acceptance rule{target, s, bestDelta, s, s.L < kDarkLightness, r.lightnessRule, bestDelta};
     for (int c = 0; c < kChannels; ++c) best[c] = start[c];
 
-    if (step > 0.0) {
+    if (r.step > 0.0) {
         const bool multi = inputs >= 5;
-        double lows[kChannels] = {0, 0, 0, blackLow, 0, 0, 0};
+        double lows[kChannels] = {0, 0, 0, r.blackLow, 0, 0, 0};
         double highs[kChannels];
         for (int c = 0; c < kChannels; ++c) highs[c] = flags[c] ? 255.0 : 0.0;
-        highs[kBlack] = (flags[kBlack] ? 1.0 : 0.0) * blackHigh;
-        GridWalk walk(forward, rule, highs, lows, multi ? kChannels : 4, limit, multi, step, best);
+        highs[kBlack] = (flags[kBlack] ? 1.0 : 0.0) * r.blackHigh;
+        GridWalk walk(forward, rule, highs, lows, multi ? kChannels : 4, r.limit, multi, r.step, best);
         walk.Walk(0, 0);
     }
     bestDelta = Distance(rule.reference, target);
@@ -207,14 +208,12 @@ void ConstrainedDescent(CProfil& p, const double* target, const double* start, d
     for (const DescentPhase& ph : kDescentPhases) {
         // In the first phase the lightness rule holds for dark starts too while black comes down.
         const bool darkExempt = &ph != &kDescentPhases[0];
-        for (;;) {
-            const double roundStart = rule.best;
+        RepeatRounds(ph, rule.best, [&] {
             d.Walk(kBlack, -ph.step, ph.low, darkExempt);
             for (int k = 0; k < count; ++k) d.Walk(chromatic[k], ph.step, ph.high);
             d.Walk(kBlack, ph.step, ph.high);
             for (int k = 0; k < count; ++k) d.Walk(chromatic[k], -ph.step, ph.low);
-            if (!(rule.best < roundStart && rule.best > ph.enough)) break;
-        }
+        });
     }
     deltaE = Distance(rule.reference, target);
 }
@@ -239,14 +238,12 @@ void RangedDescent(CProfil& p, const double* target, const double* start, double
     auto movable = [&](int c) { return flags[c] && best[c] > low && best[c] < high; };
 
     for (const DescentPhase& ph : kDescentPhases) {
-        for (;;) {
-            const double roundStart = bestDelta;
+        RepeatRounds(ph, bestDelta, [&] {
             for (int c = 0; c < 4; ++c)
                 if (movable(c) && best[c] < ph.high) tryStep(c, ph.step);
             for (int c = 0; c < 4; ++c)
                 if (movable(c) && best[c] > ph.low) tryStep(c, -ph.step);
-            if (!(bestDelta < roundStart && bestDelta > ph.enough)) break;
-        }
+        });
     }
     deltaE = bestDelta;
 }

@@ -22,14 +22,35 @@ struct DescentPhase {
 };
 constexpr DescentPhase kDescentPhases[2] = {{1.0, 254.0, 1.0, 0.2}, {0.1, 254.9, 0.1, 0.1}};
 
-// Every lattice point of step `step`: channels 0..2 (and 4..6) from 0 up to 255 where their
-// flag is set, black from blackLow up to blackHigh (flag 3 set); at most `limit` channels in
-// use (value > 0) at once; for five or more colourants, pairs and triples of chromatic
-// colourants that must not print together are refused. `bestDelta` comes in as the error to
-// beat and goes out as the error of the answer, written to `best` (7).
-void ConstrainedGridSearch(CProfil& profile, const double* target, const double* start, double blackLow,
-                           double blackHigh, double& bestDelta, double step, int limit, const int* flags,
-                           bool lightnessRule, double* best);
+// The round loop every descent shares: `round` runs again while it lowered `best` and `best`
+// stays above the phase's `enough`.
+template <typename Round>
+void RepeatRounds(const DescentPhase& phase, const double& best, Round&& round) {
+    for (;;) {
+        const double roundStart = best;
+        round();
+        if (!(best < roundStart && best > phase.enough)) return;
+    }
+}
+
+// What the grid search looks for and under which rules.
+struct GridSearchRequest {
+    const double* target = nullptr;  // L*, a*, b*
+    const double* start = nullptr;   // 7 device values; their colour bounds the answer's drift
+    double blackLow = 0.0;           // black runs from blackLow up to blackHigh
+    double blackHigh = 255.0;
+    double step = 1.0;               // lattice step on 0..255
+    int limit = 4;                   // most colourants in use (value > 0) at once
+    const int* flags = nullptr;      // 7 flags: channels that may move
+    bool lightnessRule = true;
+};
+
+// Every lattice point of the request's step: channels 0..2 (and 4..6) from 0 up to 255 where
+// their flag is set, black from blackLow up to blackHigh (flag 3 set); at most `limit` channels
+// in use at once; for five or more colourants, pairs and triples of chromatic colourants that
+// must not print together are refused. `bestDelta` comes in as the error to beat and goes out as
+// the error of the answer, written to `best` (7).
+void ConstrainedGridSearch(CProfil& profile, const GridSearchRequest& request, double& bestDelta, double* best);
 
 // Coordinate descent over all seven channels (steps 1.0, then 0.1) under the same rules;
 // channels whose flag is 0 never move. The answer goes to `best` (7), its error to `deltaE`.

@@ -12,6 +12,14 @@
 namespace vantrel {
 namespace {
 
+// Starts this far off (a ΔE no real colour pair reaches) are first replaced by channel scans,
+// and a little further off by a coarse lattice search as well.
+constexpr double kScanBeyond = 300.2;
+constexpr double kLatticeBeyond = 300.5;
+// The lattice of that last resort: step and most colourants at once, black held at the start's.
+constexpr double kLatticeStep = 12.25;
+constexpr int kLatticeInks = 3;
+
 // The inverse matrix/TRC set of direction 1: the table-encoded Lab of the evaluation vector to
 // XYZ, through the inverse colorant matrix and the inverse tone curves to R, G, B.
 void MatrixTrcInverse(CProfil& p) {
@@ -45,8 +53,7 @@ double DeltaTo(CProfil& p, const double* target, const double* w, int channels) 
 // bound and then down while above its lower one, keeping only strict improvements; rounds repeat
 // while they help and the difference stays above the phase's threshold.
 void Descend(CProfil& p, const double* target, double* w, int channels, double& best, const DescentPhase& ph) {
-    for (;;) {
-        const double roundStart = best;
+    RepeatRounds(ph, best, [&] {
         for (const double step : {ph.step, -ph.step}) {
             for (int c = 0; c < 3; ++c) {
                 while (step > 0.0 ? w[c] < ph.high : w[c] > ph.low) {
@@ -61,8 +68,7 @@ void Descend(CProfil& p, const double* target, double* w, int channels, double& 
                 }
             }
         }
-        if (!(best < roundStart && best > ph.enough)) return;
-    }
+    });
 }
 
 }  // namespace
@@ -119,19 +125,27 @@ double* InverseSearch(CProfil& p, double L, double a, double b, const double* st
 
     // A start this far off is replaced by scans and a coarse lattice before the descent.
     double best = startDelta;
-    if (startDelta > 300.2) {
+    if (startDelta > kScanBeyond) {
         for (int c = 0; c < 3; ++c) w[c] = ScanChannel(p, target, w, c, 0.0, 255.0);
     }
-    if (startDelta > 300.5) {
+    if (startDelta > kLatticeBeyond) {
         const int inUse[7] = {start[0] >= 0.5, start[1] >= 0.5, start[2] >= 0.5, 1, 0, 0, 0};
         const double from[7] = {w[0], w[1], w[2], w[3], 0, 0, 0};
+        GridSearchRequest request;
+        request.target = target;
+        request.start = from;
+        request.blackLow = start[3] - 0.5;
+        request.blackHigh = start[3] + 0.5;
+        request.step = kLatticeStep;
+        request.limit = kLatticeInks;
+        request.flags = inUse;
+        request.lightnessRule = true;
         double found[7];
         double gridDelta = startDelta;
-        ConstrainedGridSearch(p, target, from, start[3] - 0.5, start[3] + 0.5, gridDelta, 12.25, 3, inUse, true,
-                              found);
+        ConstrainedGridSearch(p, request, gridDelta, found);
         std::copy(found, found + 4, w);
     }
-    if (startDelta > 300.2) best = DeltaTo(p, target, w, channels);
+    if (startDelta > kScanBeyond) best = DeltaTo(p, target, w, channels);
     for (const DescentPhase& ph : kDescentPhases) Descend(p, target, w, channels, best, ph);
 
     const bool improved = best < startDelta;

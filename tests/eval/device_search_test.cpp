@@ -12,6 +12,21 @@ namespace {
 
 using namespace test;
 
+// The grid search with its request written out in the order of its fields.
+void GridSearch(CProfil& p, const double* target, const double* start, double blackLow, double blackHigh,
+                double& delta, double step, int limit, const int* flags, bool lightnessRule, double* best) {
+    GridSearchRequest r;
+    r.target = target;
+    r.start = start;
+    r.blackLow = blackLow;
+    r.blackHigh = blackHigh;
+    r.step = step;
+    r.limit = limit;
+    r.flags = flags;
+    r.lightnessRule = lightnessRule;
+    ConstrainedGridSearch(p, r, delta, best);
+}
+
 // L* = 60 - 24 c, a* = 40 m, b* = 40 y (fractions of the device values); black does nothing.
 // On the 12.75 lattice: L* = 60 - 1.2 i, a* = 2 j, b* = 2 k.
 class SearchOnRamps : public ::testing::Test {
@@ -36,7 +51,7 @@ TEST_F(SearchOnRamps, LightnessRuleRefusesACloserColourDarkerThanTargetAndStart)
     for (bool rule : {false, true}) {
         double best[7];
         double delta = To(target_, start_);
-        ConstrainedGridSearch(p_, target_, start_, 0, 0, delta, 12.75, 3, allChroma_, rule, best);
+        GridSearch(p_, target_, start_, 0, 0, delta, 12.75, 3, allChroma_, rule, best);
         EXPECT_DOUBLE_EQ(best[0], 12.75 * (rule ? 16 : 17)) << rule;
         EXPECT_DOUBLE_EQ(best[1], 12.75 * 10) << rule;
         EXPECT_DOUBLE_EQ(best[2], 12.75 * 10) << rule;
@@ -50,14 +65,14 @@ TEST_F(SearchOnRamps, ACandidateOnlyAsGoodAsTheBestIsNotTaken) {
     const int withBlack[7] = {1, 1, 1, 1, 0, 0, 0};
     double best[7];
     double delta = To(target_, start_);
-    ConstrainedGridSearch(p_, target_, start_, 0, 255, delta, 255, 4, withBlack, false, best);
+    GridSearch(p_, target_, start_, 0, 255, delta, 255, 4, withBlack, false, best);
     EXPECT_EQ(std::vector<double>(best, best + 4), (std::vector<double>{255, 0, 0, 0}));
 }
 
 TEST_F(SearchOnRamps, AnswersStayCloserToTheStartColourThanTheIncomingError) {
     double best[7];
     double delta = 5.0;  // nothing within 5 of the start improves on it
-    ConstrainedGridSearch(p_, target_, start_, 0, 0, delta, 12.75, 3, allChroma_, false, best);
+    GridSearch(p_, target_, start_, 0, 0, delta, 12.75, 3, allChroma_, false, best);
     EXPECT_EQ(std::vector<double>(best, best + 7), std::vector<double>(start_, start_ + 7));
     EXPECT_NEAR(delta, To(target_, start_), 1e-9);
 }
@@ -68,7 +83,7 @@ TEST_F(SearchOnRamps, BlackAloneWithOneValueGivesThatVector) {
     const double target[3] = {60.1, -0.1, -0.1};  // just past (60, 0, 0) seen from the start
     double best[7];
     double delta = To(target, from);
-    ConstrainedGridSearch(p_, target, from, 51, 51, delta, 12.25, 3, blackOnly, false, best);
+    GridSearch(p_, target, from, 51, 51, delta, 12.25, 3, blackOnly, false, best);
     EXPECT_EQ(std::vector<double>(best, best + 7), (std::vector<double>{0, 0, 0, 51, 0, 0, 0}));
     EXPECT_NEAR(delta, std::sqrt(0.03), 0.01);  // a* = 0 is stored as 32768 / 257 - 127.5
 }
@@ -120,7 +135,7 @@ TEST(ConstrainedSearch, RefusedColourantPairsAreNeverAnswered) {
         const double target[3] = {20, 0, 0};
         double best[7];
         double delta = 60.5;  // the ball around the start must reach the target
-        ConstrainedGridSearch(p, target, start, 0, 255, delta, 85, 3, flags, false, best);
+        GridSearch(p, target, start, 0, 255, delta, 85, 3, flags, false, best);
         if (partner == 4) {
             // Colourants 0 and 4 (bit sum 17) never print together, with or without black.
             EXPECT_FALSE(best[0] > 0 && best[4] > 0);
