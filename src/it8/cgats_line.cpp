@@ -14,10 +14,12 @@ bool CgatsLineReader::Next(std::string& line) {
     for (;;) {
         const int c = buffer_->sbumpc();
         if (c == Traits::eof()) return !line.empty();
+        if (c == '\n' || (c == '\r' && buffer_->sgetc() != '\n')) ++breaks_;
         if (EndsLine(c)) {
             if (line.empty()) continue;
             return true;
         }
+        if (line.empty()) lineNumber_ = breaks_ + 1;
         if (line.size() == kMaxLineLength) {
             overlong_ = true;
             line.clear();

@@ -23,10 +23,14 @@ public:
     // longer than kMaxLineLength (Overlong() tells which).
     bool Next(std::string& line);
     bool Overlong() const { return overlong_; }
+    // The file line (counting from 1) on which the line last returned began.
+    int LineNumber() const { return lineNumber_; }
 
 private:
     std::streambuf* buffer_;
     bool overlong_ = false;
+    int breaks_ = 0;  // line breaks passed: LF, CR LF or a lone CR count one each
+    int lineNumber_ = 0;
 };
 
 // The blank- and tab-separated tokens of a line, empty tokens dropped.

@@ -7,6 +7,7 @@
 
 #include "it8/cgats_line.h"
 #include "it8/cgats_number.h"
+#include "it8/color_ctrl_errors.h"
 #include "it8/measured_it8.h"
 
 namespace vantrel {
@@ -39,8 +40,26 @@ int32_t* HeaderNumber(It8Header& header, const std::string& keyword) {
 
 }  // namespace
 
+const char* It8ErrorText(int32_t code) {
+    switch (code) {
+        case 0: return "read";
+        case kIt8WriteNoRecords: return "no records to write";
+        case kIt8WriteCannotCreate: return "the file cannot be created";
+        case kIt8CannotOpen: return "the file cannot be opened as a measurement file";
+        case kIt8NoSets: return "NUMBER_OF_SETS is missing or not above 0";
+        case kIt8NoFieldNames: return "no field names (BEGIN_DATA_FORMAT) before BEGIN_DATA";
+        case kIt8NoDataBlock: return "no BEGIN_DATA";
+        case kIt8EndsInDataBlock: return "the file ends before END_DATA";
+        case kIt8TooFewSets: return "END_DATA comes before NUMBER_OF_SETS rows";
+        case kIt8RowFieldCount: return "a row has another number of values than the data format";
+        case kIt8TooManySets: return "more rows than NUMBER_OF_SETS";
+        default: return "the file cannot be written";
+    }
+}
+
 int32_t Measured_IT8::ReadIt8(const std::string& path) {
     Reset();
+    m_FailureLine = 0;
     // Only a regular file has an end: a directory, a device such as /dev/zero or a pipe is not a
     // measurement file.
     std::error_code error;
@@ -48,14 +67,17 @@ int32_t Measured_IT8::ReadIt8(const std::string& path) {
     if (!error && status.type() != std::filesystem::file_type::regular) return kIt8CannotOpen;
     std::ifstream in(path);
     if (!in.is_open()) return kIt8CannotOpen;
-    const int32_t result = ReadOpened(in);
+    CgatsLineReader reader(in);
+    const int32_t result = ReadOpened(reader);
     // Half a file is no use to anyone: a failed read leaves the object empty.
-    if (result != 0) Reset();
+    if (result != 0) {
+        Reset();
+        m_FailureLine = reader.LineNumber();
+    }
     return result;
 }
 
-int32_t Measured_IT8::ReadOpened(std::istream& in) {
-    CgatsLineReader reader(in);
+int32_t Measured_IT8::ReadOpened(CgatsLineReader& reader) {
     std::string line;
     std::vector<std::string> tokens;
 

@@ -13,6 +13,8 @@
 
 namespace vantrel {
 
+class CgatsLineReader;
+
 // The columns the library understands, by what they hold.
 enum It8Column : int {
     kColCyan, kColMagenta, kColYellow, kColBlack,
@@ -66,6 +68,9 @@ public:
 
     // Reads a CGATS file: 0, or one of the reader's eColorCtrlErrors codes.
     int32_t ReadIt8(const std::string& path);
+    // The file line on which the last failed read stopped; 0 after a successful read or when the
+    // file could not be opened.
+    int FailureLine() const { return m_FailureLine; }
 
     // Writes records as a measurement file (cgats_writer.cpp). setCount 0 takes this object's
     // NUMBER_OF_SETS; strips and columns are written when non-zero; a non-zero borderFlag writes
@@ -110,7 +115,7 @@ private:
     void Reset();
     // Forgets the columns of the data format (positions, names, spectral lists).
     void ClearFormat();
-    int32_t ReadOpened(std::istream& in);
+    int32_t ReadOpened(CgatsLineReader& reader);
     // Takes the names of the data-format line: field list, name map, column positions, spectral lists.
     void TakeFieldNames(const std::vector<std::string>& names);
     void TakeColumn(int32_t column, const std::string& name);
@@ -131,6 +136,10 @@ private:
     std::string m_LayoutId;
     std::vector<std::string> m_FieldNames;
     It8Header m_Header;
+    int m_FailureLine = 0;
 };
+
+// What a reader or writer code means, in a few words for the user ("the file cannot be opened").
+const char* It8ErrorText(int32_t code);
 
 }  // namespace vantrel

@@ -294,3 +294,20 @@ TEST(CgatsReaderFailures, BinaryGarbageEndsInACode) {
         EXPECT_LT(it8.ReadIt8(icc), 0);
     }
 }
+
+// A refused file says where the reader stopped, counting lines as an editor does (LF, CR LF or a
+// lone CR each end one), so that the user can be told which line to look at.
+TEST(CgatsReader, AFailedReadKeepsTheLineItStoppedOn) {
+    for (const std::string eol : {"\n", "\r\n", "\r"}) {
+        const std::string text = "CGATS.17" + eol + "NUMBER_OF_SETS 2" + eol + eol + "BEGIN_DATA_FORMAT" + eol +
+                                 "ID CMYK_C LAB_L" + eol + "END_DATA_FORMAT" + eol + "BEGIN_DATA" + eol + "1 0 95" + eol +
+                                 "2 0" + eol + "END_DATA" + eol;
+        Measured_IT8 it8;
+        EXPECT_EQ(Read(it8, text), kIt8RowFieldCount);
+        EXPECT_EQ(it8.FailureLine(), 9) << "line end " << (eol == "\n" ? "LF" : eol == "\r" ? "CR" : "CRLF");
+    }
+    Measured_IT8 it8;
+    ASSERT_EQ(Read(it8, Cgats("ID CMYK_C LAB_L", {"1 0 95"})), 0);
+    EXPECT_EQ(it8.FailureLine(), 0);
+    EXPECT_STREQ(It8ErrorText(kIt8RowFieldCount), "a row has another number of values than the data format");
+}
