@@ -12,7 +12,7 @@
 // colorimetric agree.
 //
 // Each profile is v2 with mft2 tables: A2B0 = A2B1 (device to Lab, 256-entry straight curves) and
-// B2A0 = B2A1 (Lab to device, grid 11). The separation is a hue-sector one with full black
+// B2A0 = B2A1 (Lab to device, grid 17). The separation is a hue-sector one with full black
 // replacement: every colour is two inks adjacent in hue plus black, so orange, green, red or blue
 // ink prints where it extends the gamut beyond what the two process inks beside it reach.
 // Profiles are written once per test process into a temporary directory.
@@ -139,10 +139,11 @@ inline double Distance(const Lab& x, const Lab& y) {
 }
 
 // Inks (0..1 per channel) for `target`: the best of every sector's pair plus black, found from a
-// coarse lattice by a shrinking pattern search.
+// coarse lattice by a shrinking pattern search. `forward` gives the colour of inks (7 values).
+template <typename Forward>
 class Separation {
 public:
-    Separation(const Set& set, const Tables& model) : set_(set), model_(model) {
+    Separation(const Set& set, Forward forward) : set_(set), forward_(forward) {
         for (size_t s = 0; s < set.sectors.size(); ++s)
             for (int i = 0; i <= kCoarse; ++i)
                 for (int j = 0; j <= kCoarse; ++j)
@@ -214,10 +215,10 @@ private:
         inks[3] = p[2];  // black is channel 3 of every set
         return inks;
     }
-    Lab Colour(int sector, const std::array<double, 3>& p) const { return model_.Evaluate(Channels(sector, p).data()); }
+    Lab Colour(int sector, const std::array<double, 3>& p) const { return forward_(Channels(sector, p).data()); }
 
     const Set& set_;
-    const Tables& model_;
+    Forward forward_;
     std::vector<Start> coarse_;
 };
 
@@ -258,19 +259,27 @@ cmsPipeline* ClutPipeline(int inputs, int outputs, int grid, Node node) {
 
 // Grid points of the separation tables: enough for smooth separations, few enough that the
 // profiles take a second to build in a sanitizer build.
-constexpr int kSeparationGrid = 11;
+constexpr int kSeparationGrid = 17;
 
 inline bool WriteProfile(InkSet which, const std::string& path) {
     const Set& set = SetOf(which);
     const Tables model(set);
     const int n = static_cast<int>(set.inks.size());
     cmsPipeline* forward = ClutPipeline(n, 3, set.grid, [&](const cmsUInt16Number in[], cmsUInt16Number out[]) {
-        double inks[7];
+        double inks[7] = {};
         for (int i = 0; i < n; ++i) inks[i] = in[i] / 65535.0;
         const auto v = EncodeLabV2(model.Evaluate(inks));
         std::copy(v.begin(), v.end(), out);
     });
-    const Separation separation(set, model);
+    // The separation inverts the forward table as lcms2 interpolates it, so that the two tables
+    // agree with each other, as a profiler's do.
+    auto table = [forward, n](const double* inks) {
+        float in[7], out[3];
+        for (int i = 0; i < n; ++i) in[i] = static_cast<float>(inks[i]);
+        cmsPipelineEvalFloat(in, out, forward);
+        return Lab{out[0] * 65535.0 / 652.8, out[1] * 65535.0 / 256.0 - 128, out[2] * 65535.0 / 256.0 - 128};
+    };
+    const Separation<decltype(table)> separation(set, table);
     cmsPipeline* backward = ClutPipeline(3, n, kSeparationGrid, [&](const cmsUInt16Number in[], cmsUInt16Number out[]) {
         const Lab target{in[0] / 652.8, in[1] / 256.0 - 128, in[2] / 256.0 - 128};
         const std::vector<double> inks = separation.Inks(target);
@@ -308,6 +317,11 @@ inline Lab InkModelLab(InkSet s, const double* inks) {
     if (it == models.end()) it = models.emplace(s, multi_ink::Tables(multi_ink::SetOf(s))).first;
     return it->second.Evaluate(inks);
 }
+
+// lcms2 reads the a*, b* of these v2 tables as v / 256 - 128; the library reads every 16-bit
+// Lab table as v / 257 - 127.5 (0.4 % short towards the ends). An lcms2 a* or b* as the library
+// reads the same table value.
+inline double AsReadFromSixteenBits(double ab) { return (ab + 128) * 256 / 257 - 127.5; }
 
 // The profile's path, written on first use; empty when lcms2 could not write it.
 inline const std::string& MultiInkProfile(InkSet s) {
