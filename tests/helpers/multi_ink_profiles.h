@@ -3,7 +3,7 @@
 // (no such profile is installed on these machines).
 //
 //   const std::string& path = MultiInkProfile(InkSet::kCmykOG);   // built on first use
-//   Lab lab = InkModelLab(InkSet::kCmykOG, inks);                 // the model itself, inks 0..1
+//   Lab lab = InkModelLab(InkSet::kCmykOG, inks);  // the model itself (a printer to measure), inks 0..1
 //
 // The model: a paper reflecting evenly, each ink a filter whose optical density over 400..700 nm
 // grows with its coverage (with some dot gain), overprints multiply their transmittances
@@ -12,7 +12,8 @@
 // colorimetric agree.
 //
 // Each profile is v2 with mft2 tables: A2B0 = A2B1 (device to Lab, 256-entry straight curves) and
-// B2A0 = B2A1 (Lab to device, grid 17). The separation is a hue-sector one with full black
+// B2A0 = B2A1 (Lab to device, grid 17). The A2B grid has 7 points for five inks, 6 for six, 5 for
+// seven. The separation inverts the forward table; it is a hue-sector one with full black
 // replacement: every colour is two inks adjacent in hue plus black, so orange, green, red or blue
 // ink prints where it extends the gamut beyond what the two process inks beside it reach.
 // Profiles are written once per test process into a temporary directory.
