@@ -144,3 +144,14 @@ TEST(SlotLoadersAfterRelease, AFailedLoadBuildsNoGamutFromStaleDescriptors) {
     EXPECT_DOUBLE_EQ(same.a, 20);
     EXPECT_DOUBLE_EQ(same.b, 20);
 }
+
+// The abstract switch wins: the paper profile serves both ways from its forward table, and its
+// gamut is built over a four-input slot 1.
+TEST_F(SlotLoaders, PaperLoaderWithAbstractAndIntentZeroTakesA2B0BothWays) {
+    t.m_PaperName = path;
+    t.m_AbstractOutprof = 1;
+    t.m_UseIntent0 = 1;
+    t.LoadPaperProfile(true);
+    EXPECT_EQ(Loaded(*t.m_Paperprof), "A2B0 A2B0");
+    EXPECT_EQ(t.m_Paperprof->m_Lut[1].inputChannels, 4);
+}
