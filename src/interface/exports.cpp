@@ -12,6 +12,7 @@
 #include "interface/host_number.h"
 #include "interface/parameter_file.h"
 #include "interface/tool_object.h"
+#include "optimise/merge_into_cmyk.h"
 #include "support/platform.h"
 
 using vantrel::CIterativtoolDlg;
@@ -114,9 +115,10 @@ VANTREL_API int VANTREL_CALL optimize4(void* handle, const char*, int*, int*, un
     return kNotAvailable;
 }
 
-VANTREL_API int VANTREL_CALL mergeMCHintoCMYK(void* handle, const char*, const char*, const char*) {
+VANTREL_API int VANTREL_CALL mergeMCHintoCMYK(void* handle, const char* refProfile, const char* paperProfile,
+                                              const char* outProfile) {
     if (!handle) return kNullHandle;
-    return kNotAvailable;
+    return vantrel::MergeMchIntoCmyk(*Tool(handle), refProfile, paperProfile, outProfile);
 }
 
 VANTREL_API int VANTREL_CALL Cmyk2Lab_Double(void* handle, const char* profile, int count, const int* cmyk, int,

@@ -38,6 +38,7 @@ enum class InkSet {
     kCmykO,    // "5CLR": C, M, Y, K, orange
     kCmykOG,   // "6CLR": C, M, Y, K, orange, green
     kCmykRGB,  // "7CLR": C, M, Y, K, red, green, blue
+    kCmyk,     // "CMYK": the process inks of the same model alone
 };
 
 namespace multi_ink {
@@ -93,6 +94,7 @@ inline const Set& SetOf(InkSet s) {
         {"6CLR", cmsSig6colorData, 6, {kC, kM, kY, kK, kO, kG}, {{1, 4}, {4, 2}, {2, 5}, {5, 0}, {0, 1}}},
         {"7CLR", cmsSig7colorData, 5, {kC, kM, kY, kK, kR, kG, kB},
          {{1, 4}, {4, 2}, {2, 5}, {5, 0}, {0, 6}, {6, 1}}},
+        {"CMYK", cmsSigCmykData, 9, {kC, kM, kY, kK}, {{1, 2}, {2, 0}, {0, 1}}},
     };
     return sets[static_cast<int>(s)];
 }

@@ -307,6 +307,30 @@ static void IsdAnalysis(const VantrelApi* api, const ScenarioPaths* paths, FILE*
     if (handle) fprintf(out, "dllFree = %d\n", api->dllFree(handle));
 }
 
+/* ---- mergeMCHintoCMYK -------------------------------------------------------------------
+ * The seven-ink test reference folded into the FOGRA39L profile: the merged copy must be the
+ * same file in both builds. */
+static void MergeIntoCmyk(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
+    char* reference = Join(paths->fixtures, "ink-7CLR.icc");
+    char* cmyk = Join(paths->fixtures, "FOGRA39L.icc");
+    char* merged = Join(paths->work, "merged.icc");
+    void* handle = NULL;
+    int rc = api->dllInit(OnProgress, &handle, NULL);
+    fprintf(out, "dllInit(for mergeMCHintoCMYK) = %d\n", rc);
+    ProgressLine(out);
+    if (handle && reference && cmyk && merged) {
+        rc = api->mergeMCHintoCMYK(handle, reference, cmyk, merged);
+        fprintf(out, "mergeMCHintoCMYK(ink-7CLR.icc, FOGRA39L.icc) = %d\n", rc);
+        ProgressLine(out);
+        FileLine(out, paths->work, "merged.icc");
+        Check(rc == 0, "mergeMCHintoCMYK on the test reference");
+    }
+    if (handle) fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+    free(reference);
+    free(cmyk);
+    free(merged);
+}
+
 int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     g_failures = 0;
     DigestReset(&g_progress);
@@ -315,6 +339,7 @@ int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     Conversions(api, paths, out);
     DeviceSearches(api, paths, out);
     IsdAnalysis(api, paths, out);
+    MergeIntoCmyk(api, paths, out);
     fflush(out);
     return g_failures;
 }
