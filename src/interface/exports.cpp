@@ -48,8 +48,7 @@ VANTREL_API int VANTREL_CALL dllInit(ProgressCallback progress, void** handleOut
         profile->MarkReleased();
     tool->m_SavedTable.clear();
     tool->m_Progress = progress;
-    vantrel::ReadParameterFile(vantrel::platform::ParameterFilePath(), tool->m_Params.data(),
-                               CIterativtoolDlg::kParamCount);
+    vantrel::ReadFixedParameterFile(tool->m_Params.data(), CIterativtoolDlg::kParamCount);
     *handleOut = tool.release();
     return 0;
 }

@@ -3,6 +3,7 @@
 #include <cmath>
 #include <cstdio>
 
+#include "support/platform.h"
 #include "support/rounding.h"
 
 namespace vantrel {
@@ -19,10 +20,8 @@ bool ParseValue(const char* line, int& value) {
     return true;
 }
 
-}  // namespace
-
-int ReadParameterFile(const std::string& path, int* values, int limit) {
-    std::FILE* file = std::fopen(path.c_str(), "r");
+// Reads the values from an open file, and closes it; nothing from a null one.
+int ReadParameters(std::FILE* file, int* values, int limit) {
     if (!file) return 0;
     int stored = 0;
     // The first 255 characters of a line decide; the rest of an over-long line
@@ -40,6 +39,16 @@ int ReadParameterFile(const std::string& path, int* values, int limit) {
     }
     std::fclose(file);
     return stored;
+}
+
+}  // namespace
+
+int ReadParameterFile(const std::string& path, int* values, int limit) {
+    return ReadParameters(std::fopen(path.c_str(), "r"), values, limit);
+}
+
+int ReadFixedParameterFile(int* values, int limit) {
+    return ReadParameters(platform::OpenFixedFile(platform::ParameterFilePath()), values, limit);
 }
 
 }  // namespace vantrel

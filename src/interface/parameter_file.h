@@ -10,4 +10,8 @@ namespace vantrel {
 // a file that cannot be opened stores none.
 int ReadParameterFile(const std::string& path, int* values, int limit);
 
+// The same from the fixed parameter file, which is read only when it can be trusted (see
+// platform::OpenFixedFile).
+int ReadFixedParameterFile(int* values, int limit);
+
 }  // namespace vantrel

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <cstdint>
+#include <cstdio>
 #include <vector>
 
 // What the library takes from the operating system: its fixed file paths, the user's
@@ -11,6 +12,15 @@ namespace vantrel::platform {
 const char* ParameterFilePath();
 // The ISD profile that the reference analysis writes and reads.
 const char* IsdProfilePath();
+
+// The fixed files sit in a folder every local user can write (/tmp on POSIX). One of them is
+// used only when nobody else could have put it there: a regular file, reached without a
+// symbolic link, owned by the user the library runs as and not writable by group or others.
+// Anything else is treated as absent. (On Windows the folder is the user's own c:/temp.)
+// Opens a trusted fixed file for reading in text mode; null when it is absent or not trusted.
+std::FILE* OpenFixedFile(const char* path);
+// True when the fixed file is there and trusted; its size goes to `size`.
+bool FixedFileTrusted(const char* path, uint64_t& size);
 
 // The decimal separator of the user's default locale, as the system's settings give it;
 // '.' when they cannot be read.

@@ -12,6 +12,19 @@ namespace vantrel::platform {
 const char* ParameterFilePath() { return "c:/temp/vantrelparams.txt"; }
 const char* IsdProfilePath() { return "c:/temp/vantrel.isd"; }
 
+std::FILE* OpenFixedFile(const char* path) { return path ? std::fopen(path, "rt") : nullptr; }
+
+bool FixedFileTrusted(const char* path, uint64_t& size) {
+    std::FILE* file = path ? std::fopen(path, "rb") : nullptr;
+    if (!file) return false;
+    const bool known = std::fseek(file, 0, SEEK_END) == 0;
+    const long end = known ? std::ftell(file) : -1;
+    std::fclose(file);
+    if (end < 0) return false;
+    size = static_cast<uint64_t>(end);
+    return true;
+}
+
 // The C++ runtime's std::locale("") knows only "C" here; the user's number format is in the
 // regional settings.
 char UserDecimalPoint() {
