@@ -121,15 +121,16 @@ AnalysisFigures CIterativtoolDlg::MergedAnalysis() {
     if (!(m_ReferenceIT8Name > kNoFileSelected && m_MeasIT8Name > kNoFileSelected)) return figures;
     if (!m_ReferenceIT8 || !m_MeasIT8) return figures;
     // Patches of different device kinds cannot be paired by their values.
-    if (!SameKind(ProbeIt8Kind(*m_ReferenceIT8), ProbeIt8Kind(*m_MeasIT8))) return figures;
+    const It8Kind kind = ProbeIt8Kind(*m_ReferenceIT8);
+    if (!SameKind(kind, ProbeIt8Kind(*m_MeasIT8))) return figures;
+    const int channels = ComparedChannels(kind);
+    if (channels == 0) return figures;
 
     const int countR = m_ReferenceIT8->PatchCount();
     const int countM = m_MeasIT8->PatchCount();
     if (countR == countM) {
         // One layout when the first, second and last patches agree in whole numbers: the files this
         // library derives from a chart (ISD copy, simulated reference) round its device values.
-        const It8Kind kind = ProbeIt8Kind(*m_ReferenceIT8);
-        const int channels = ComparedChannels(kind);
         bool differs = false;
         for (int patch : {0, 1, std::max(countR - 1, 0)})
             if (!SameDevice(WholeDevice(*m_ReferenceIT8, kind, patch), WholeDevice(*m_MeasIT8, kind, patch), channels))
@@ -150,9 +151,6 @@ AnalysisFigures CIterativtoolDlg::MergedAnalysis() {
     if (n < 1) return figures;
     if (carry && m_PrevMeasIT8->PatchCount() != n) carry = false;
 
-    const It8Kind kind = ProbeIt8Kind(*m_ReferenceIT8);
-    const int channels = ComparedChannels(kind);
-    if (channels == 0) return figures;
     std::vector<PatchRecord> records(static_cast<std::size_t>(n));
     records[0].kind = static_cast<uint32_t>(channels);
 
