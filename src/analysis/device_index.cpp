@@ -58,7 +58,7 @@ DevicePatchIndex::DevicePatchIndex(const Measured_IT8& it8, const It8Kind& kind)
 int DevicePatchIndex::Find(const DeviceKey& target) const {
     if (channels_ == 0 || HasNan(target)) return -1;
     DeviceKey key{};
-    for (int c = 0; c < channels_; ++c) key[static_cast<std::size_t>(c)] = KeyValue(target[static_cast<std::size_t>(c)]);
+    for (std::size_t c = 0; c < static_cast<std::size_t>(channels_); ++c) key[c] = KeyValue(target[c]);
     const auto first = std::lower_bound(entries_.begin(), entries_.end(), std::make_pair(key, -1));
     if (first == entries_.end() || first->first != key) return -1;
     return first->second;
