@@ -25,7 +25,7 @@ void AlignInOrderOf(const CIterativtoolDlg& tool, const Measured_IT8& order, std
                     std::string& scannedName, Lab& scannedWhite) {
     const int n = order.PatchCount();
     if (n < 1) return;
-    const It8Kind kind = ProbeIt8Kind(*scanned);
+    const It8Kind kind = ProbeIt8Kind(*scanned, kScanProbePatch);
     const int channels = ComparedChannels(kind);
     const DevicePatchIndex index(*scanned, kind);
 

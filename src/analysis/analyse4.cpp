@@ -56,7 +56,7 @@ void CIterativtoolDlg::SimulateReference() {
     if (m_RefName == kNoProfileSelected || m_RefName.empty()) return;
     const int n = m_MeasIT8 ? m_MeasIT8->PatchCount() : 0;
     if (n < 1) return;
-    const It8Kind kind = ProbeIt8Kind(*m_MeasIT8);
+    const It8Kind kind = ProbeIt8Kind(*m_MeasIT8, kScanProbePatch);
     const int channels = ComparedChannels(kind);
     if (channels == 0 || !TakesChannels(*m_Refprof, channels)) return;
     const double scale = kind.device == It8Kind::kRgb ? 1.0 : 2.55;

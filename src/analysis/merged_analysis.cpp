@@ -35,7 +35,8 @@ DeviceKey WholeDevice(const Measured_IT8& it8, const It8Kind& kind, int patch) {
     return v;
 }
 
-bool ColourFromXyz(const Measured_IT8& it8) { return it8.GetLab(0, 0) == Measured_IT8::kNoColumn; }
+// The comparison takes its colour sources from the first patch of each file.
+bool ColourFromXyz(const Measured_IT8& it8) { return It8ColourFromXyz(it8, 0); }
 
 // Device values of a patch as the link takes them: CMYK without a negative black.
 DeviceKey LinkDevice(const Measured_IT8& it8, const It8Kind& kind, int patch) {
@@ -70,7 +71,7 @@ public:
             if (record[c] != 0) paper = false;
         }
         if (paper) return false;
-        for (int c = 0; c < channels_; ++c) record[channels_ + c] = record[c];
+        PlaceLocatedNode(*link_, record, 1, NodeFields::kDevice);
         return true;
     }
 
@@ -121,8 +122,8 @@ AnalysisFigures CIterativtoolDlg::MergedAnalysis() {
     if (!(m_ReferenceIT8Name > kNoFileSelected && m_MeasIT8Name > kNoFileSelected)) return figures;
     if (!m_ReferenceIT8 || !m_MeasIT8) return figures;
     // Patches of different device kinds cannot be paired by their values.
-    const It8Kind kind = ProbeIt8Kind(*m_ReferenceIT8);
-    if (!SameKind(kind, ProbeIt8Kind(*m_MeasIT8))) return figures;
+    const It8Kind kind = ProbeIt8Kind(*m_ReferenceIT8, kScanProbePatch);
+    if (!SameKind(kind, ProbeIt8Kind(*m_MeasIT8, kScanProbePatch))) return figures;
     const int channels = ComparedChannels(kind);
     if (channels == 0) return figures;
 
@@ -158,7 +159,7 @@ AnalysisFigures CIterativtoolDlg::MergedAnalysis() {
     const bool measFromXyz = ColourFromXyz(*m_MeasIT8);
     const bool prevFromXyz = carry && ColourFromXyz(*m_PrevMeasIT8);
     if (carry && prevFromXyz && m_PrevMeasIT8->GetXyz(0, 0) == Measured_IT8::kNoColumn) carry = false;
-    if (carry && !SameKind(ProbeIt8Kind(*m_PrevMeasIT8), kind)) carry = false;
+    if (carry && !SameKind(ProbeIt8Kind(*m_PrevMeasIT8, kScanProbePatch), kind)) carry = false;
     const LinkCorrection link(m_CorrectOutprof ? m_Outprof.get() : nullptr, kind);
 
     double sum = 0;

@@ -39,7 +39,7 @@ AnalysisFigures CIterativtoolDlg::RepeatabilityAnalysis(const Measured_IT8& it8)
     AnalysisFigures figures;
     const int n = it8.PatchCount();
     if (n < 1) return figures;
-    const It8Kind kind = ProbeIt8Kind(it8);
+    const It8Kind kind = ProbeIt8Kind(it8, kScanProbePatch);
     const int channels = ComparedChannels(kind);
     if (channels == 0) return figures;
 
