@@ -14,7 +14,6 @@
 #include "interface/host_number.h"
 #include "interface/tool_object.h"
 #include "it8/patch_record.h"
-#include "support/cfile.h"
 #include "support/platform.h"
 
 namespace vantrel {
@@ -23,16 +22,17 @@ namespace {
 constexpr const char* kSimulatedSuffix = ".it8";
 // The sizes of the ISD profiles the analysis applies by itself: 714612 bytes is the embedded
 // neutral profile.
-constexpr int64_t kIsdSizes[] = {564220, 714612};
+constexpr uint64_t kIsdSizes[] = {564220, 714612};
 constexpr int kNoMean = 255000;
 constexpr int kNoMaximum = 300000;
 
 std::string Text(const char* s) { return s ? std::string(s) : std::string(); }
 
+// Only a file the platform layer trusts counts: anyone may write to the folder it stands in.
 bool IsdProfileWaiting() {
-    const CFile isd(platform::IsdProfilePath(), CFile::kBinary);
-    const int64_t size = isd.Size();
-    for (int64_t known : kIsdSizes)
+    uint64_t size = 0;
+    if (!platform::FixedFileTrusted(platform::IsdProfilePath(), size)) return false;
+    for (uint64_t known : kIsdSizes)
         if (size == known) return true;
     return false;
 }
