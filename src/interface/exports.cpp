@@ -8,6 +8,8 @@
 
 #include "analysis/analyse1_search.h"
 #include "analysis/analyse2.h"
+#include "analysis/analyse3.h"
+#include "analysis/analyse4.h"
 #include "interface/device_conversion.h"
 #include "interface/host_number.h"
 #include "interface/parameter_file.h"
@@ -82,16 +84,18 @@ VANTREL_API int VANTREL_CALL analyse2(void* handle, const char* isdProfile, cons
     return vantrel::Analyse2(*Tool(handle), isdProfile, outIT8, measIT8, out1, out2);
 }
 
-VANTREL_API int VANTREL_CALL analyse3(void* handle, const char*, const char*, const char*, const char*, int*,
-                                      int*) {
+VANTREL_API int VANTREL_CALL analyse3(void* handle, const char* paperProfile, const char* outprof3CC,
+                                      const char* referenceIT8, const char* measIT8, int* out1, int* out2) {
     if (!handle) return kNullHandle;
-    return kNotAvailable;
+    return vantrel::Analyse3(*Tool(handle), paperProfile, outprof3CC, referenceIT8, measIT8, out1, out2);
 }
 
-VANTREL_API int VANTREL_CALL analyse4(void* handle, const char*, const char*, const char*, const char*, int*, int*,
-                                      int*, int*) {
+VANTREL_API int VANTREL_CALL analyse4(void* handle, const char* paperProfile, const char* refProfile,
+                                      const char* referenceIT8, const char* measIT8, int* out1, int* out2, int* out3,
+                                      int* out4) {
     if (!handle) return kNullHandle;
-    return kNotAvailable;
+    return vantrel::Analyse4(*Tool(handle), paperProfile, refProfile, referenceIT8, measIT8, out1, out2, out3,
+                             out4);
 }
 
 VANTREL_API int VANTREL_CALL optimize1(void* handle, const char*, int*, int*) {

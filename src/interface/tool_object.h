@@ -20,6 +20,16 @@ inline constexpr const char* kNoProfileSelected = "-no profile selected-";
 inline constexpr const char* kNoIsdSelected = "-no ISD selected-";
 inline constexpr const char* kNoFileSelected = "-no file selected-";
 
+// What an analysis of measurements hands back. `differences` is false when it stopped before it
+// had a mean and a maximum.
+struct AnalysisFigures {
+    double mean = 0;
+    double maximum = 0;
+    double white = 0;  // difference of the two paper whites
+    double gamut = 0;  // share of reference colours inside the paper gamut, in percent
+    bool differences = false;
+};
+
 // All state of one job: the tool object behind a tool handle.
 class CIterativtoolDlg {
 public:
@@ -56,6 +66,21 @@ public:
     // writes m_MeasIT8 through the ISD profile's Lab-to-Lab table to m_MeasIT8Name + "isd.it8",
     // then makes that file the measurement (m_MeasIT8Name, m_MeasIT8, m_MeasWhite).
     void IsdAnalysis();
+
+    // Comparing a measurement with its reference (analysis/merged_analysis.cpp). The white
+    // difference is taken first; the mean and the maximum only once both files are named, of one
+    // device kind, aligned and non-empty. In profiling mode (m_CorrectOutprof) each patch on a node
+    // of the device link m_Outprof also corrects that node.
+    AnalysisFigures MergedAnalysis();
+    // How well the patches of equal device values in one file agree (analysis/repeatability.cpp).
+    AnalysisFigures RepeatabilityAnalysis(const Measured_IT8& it8) const;
+    // Rewrites one file in the patch order of the other, written to its name + ".$$$" and read
+    // back with its white (analysis/alignment.cpp).
+    void AlignReferenceToMeasurement();
+    void AlignMeasurementToReference();
+    // Writes the reference profile's predictions for the measured device values to
+    // m_RefName + ".it8" and makes that file the reference measurement (analysis/analyse4.cpp).
+    void SimulateReference();
 
     // Slot loaders: each loads its slot from the name the tool object holds for it, unless the
     // name is empty or still holds its default label. They report progress and check nothing

@@ -3,6 +3,7 @@
 // library's own CGATS reader.
 
 #include <array>
+#include <cctype>
 #include <fstream>
 #include <sstream>
 #include <string>
@@ -14,6 +15,14 @@ struct ChartPatch {
     std::array<double, 4> cmyk{};
     std::array<double, 3> lab{};
 };
+
+// Field names as the library writes them ("Lab_L") or as the data files have them ("LAB_L").
+inline bool SameName(const std::string& field, const char* name) {
+    if (field.size() != std::char_traits<char>::length(name)) return false;
+    for (std::size_t i = 0; i < field.size(); ++i)
+        if (std::toupper(static_cast<unsigned char>(field[i])) != name[i]) return false;
+    return true;
+}
 
 inline std::vector<ChartPatch> ReadCmykChart(const std::string& path) {
     std::ifstream in(path);
@@ -39,7 +48,7 @@ inline std::vector<ChartPatch> ReadCmykChart(const std::string& path) {
             int found = 0;
             for (size_t f = 0; f < fields.size(); ++f)
                 for (int k = 0; k < 7; ++k)
-                    if (fields[f] == names[k]) {
+                    if (SameName(fields[f], names[k])) {
                         (k < 4 ? p.cmyk[k] : p.lab[k - 4]) = std::stod(row[f]);
                         ++found;
                     }

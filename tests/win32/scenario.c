@@ -331,6 +331,130 @@ static void MergeIntoCmyk(const VantrelApi* api, const ScenarioPaths* paths, FIL
     free(merged);
 }
 
+/* ---- analyse3 and analyse4 (proof analyses) ---------------------------------------------- */
+
+/* Writes text into the work folder; returns the path (to be freed) or NULL. */
+static char* WriteWork(const ScenarioPaths* paths, const char* name, const char* text) {
+    char* path = Join(paths->work, name);
+    FILE* f = path ? fopen(path, "wb") : NULL;
+    if (f) {
+        fputs(text, f);
+        fclose(f);
+    }
+    return path;
+}
+
+/* Copies a file of folder `dir` into the work folder under `name`; returns the copy's path or NULL. */
+static char* CopyToWork(const ScenarioPaths* paths, const char* dir, const char* file, const char* name) {
+    char* source = Join(dir, file);
+    char* copy = Join(paths->work, name);
+    int ok = CopyFile(source, copy);
+    free(source);
+    if (!ok) {
+        free(copy);
+        return NULL;
+    }
+    return copy;
+}
+
+static void* ProofHandle(const ScenarioPaths* paths, const VantrelApi* api, const char* job, FILE* out) {
+    void* handle = NULL;
+    int rc = api->dllInit(OnProgress, &handle, paths->work);
+    fprintf(out, "dllInit(work dir, for %s) = %d\n", job, rc);
+    ProgressLine(out);
+    return handle;
+}
+
+static void Analyse3Job(const VantrelApi* api, const ScenarioPaths* paths, const char* label, const char* link,
+                        const char* ref, const char* meas, FILE* out) {
+    void* handle = ProofHandle(paths, api, label, out);
+    if (!handle) return;
+    int out1 = UNTOUCHED, out2 = UNTOUCHED;
+    int rc = api->analyse3(handle, "", link ? link : "", ref ? ref : "", meas, &out1, &out2);
+    fprintf(out, "analyse3(%s) = %d out %d %d\n", label, rc, out1, out2);
+    ProgressLine(out);
+    fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+}
+
+static void Analyse4Job(const VantrelApi* api, const ScenarioPaths* paths, const char* label, const char* paper,
+                        const char* refProfile, const char* ref, const char* meas, FILE* out) {
+    void* handle = ProofHandle(paths, api, label, out);
+    if (!handle) return;
+    int o[4] = {UNTOUCHED, UNTOUCHED, UNTOUCHED, UNTOUCHED};
+    int rc = api->analyse4(handle, paper ? paper : "", refProfile ? refProfile : "", ref ? ref : "", meas, &o[0],
+                           &o[1], &o[2], &o[3]);
+    fprintf(out, "analyse4(%s) = %d out %d %d %d %d\n", label, rc, o[0], o[1], o[2], o[3]);
+    ProgressLine(out);
+    fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+}
+
+#define PROOF_FIELDS "CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B\n" \
+                     "END_DATA_FORMAT\nNUMBER_OF_SETS 5\nBEGIN_DATA\n"
+
+/* A proof against its press reference, a reference simulated from a profile, charts in another
+ * order, the repeatability of one chart, and two calibration runs that correct a device link. */
+static void ProofAnalyses(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
+    char* ref = CopyToWork(paths, paths->colour, "FOGRA39L.ti3", "proof-ref.ti3");
+    char* meas = CopyToWork(paths, paths->colour, "FOGRA40L.ti3", "proof-meas.ti3");
+    char* paper = Join(paths->fixtures, "FOGRA39L.icc");
+    char* refProfile = CopyToWork(paths, paths->fixtures, "FOGRA39L.icc", "proof-ref.icc");
+    char* neutral = Join(paths->work, "neutral.3cc");
+    if (!ref || !meas || !refProfile) {
+        fprintf(out, "proof analyses: FOGRA data or fixture missing\n");
+    } else {
+        Analyse4Job(api, paths, "FOGRA39L.icc, FOGRA39L.ti3, FOGRA40L.ti3", paper, "", ref, meas, out);
+        Analyse4Job(api, paths, "simulated FOGRA39L.icc, FOGRA40L.ti3", paper, refProfile, "", meas, out);
+        TextFileLine(out, paths->work, "proof-ref.icc.it8");
+        Analyse3Job(api, paths, "neutral.3cc, FOGRA39L.ti3, FOGRA40L.ti3", neutral, ref, meas, out);
+        Analyse3Job(api, paths, "repeatability FOGRA40L.ti3", NULL, NULL, meas, out);
+        /* Patches of the chart in reverse order and a subset of them. */
+        char* shuffled = WriteWork(paths, "proof-shuffled.it8",
+                                   PROOF_FIELDS "1 100 0 100 0 47 -65 25\n2 0 0 0 100 18 1 1\n3 0 40 0 0 76 26 -7\n"
+                                                "4 0 10 0 0 91 6 -4\n5 0 0 0 0 95 0 -2\nEND_DATA\n");
+        if (shuffled) Analyse4Job(api, paths, "FOGRA39L.ti3, shuffled subset", "", "", ref, shuffled, out);
+        TextFileLine(out, paths->work, "proof-ref.ti3.$$$");
+        free(shuffled);
+    }
+    free(ref);
+    free(meas);
+    free(paper);
+    free(refProfile);
+    free(neutral);
+
+    /* Two calibration runs through a copy of the identity link: node 50/25/0/0 got worse by 0.3. */
+    char* link = CopyToWork(paths, paths->work, "cmyk2cmyk5neutral.mcc", "proof-link.mcc");
+    char* chart = WriteWork(paths, "proof-chart.it8",
+                            PROOF_FIELDS "1 0 0 0 0 95 0 0\n2 50 25 0 0 50 0 0\n3 25 0 0 0 50 0 0\n"
+                                         "4 10 0 0 0 60 0 0\n5 0 0 0 50 40 0 0\nEND_DATA\n");
+    char* run1 = WriteWork(paths, "proof_cal1.it8",
+                           PROOF_FIELDS "1 0 0 0 0 95 0 0\n2 48 27 0 0 50 0 0\n3 25 0 0 0 50 0 0\n"
+                                        "4 10 0 0 0 60 0 0\n5 0 0 0 50 40 0 0\nEND_DATA\n");
+    char* run2 = WriteWork(paths, "proof_cal2.it8",
+                           PROOF_FIELDS "1 0 0 0 0 95 0 0\n2 50 25 0 0 50 0.3 0\n3 25 0 0 0 50 0.2 0\n"
+                                        "4 10 0 0 0 60 0 0\n5 0 0 0 50 40 0 0\nEND_DATA\n");
+    void* handle = link && chart && run1 && run2 ? ProofHandle(paths, api, "calibration runs", out) : NULL;
+    if (handle) {
+        const char* runs[2] = {run1, run2};
+        for (int r = 0; r < 2; ++r) {
+            int out1 = UNTOUCHED, out2 = UNTOUCHED;
+            int rc = api->analyse3(handle, "", link, chart, runs[r], &out1, &out2);
+            fprintf(out, "analyse3(proof-link.mcc, calibration run %d) = %d out %d %d\n", r + 1, rc, out1, out2);
+            ProgressLine(out);
+        }
+        fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+        TextFileLine(out, paths->work, "proof_cal2.it8_merged.it8");
+        FileLine(out, paths->work, "proof-link.mcc");
+    } else {
+        fprintf(out, "calibration runs: files could not be written\n");
+    }
+    free(link);
+    free(chart);
+    free(run1);
+    free(run2);
+}
+
+/* ---- end of analyse3 and analyse4 ---------------------------------------------------------- */
+
 int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     g_failures = 0;
     DigestReset(&g_progress);
@@ -340,6 +464,7 @@ int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     DeviceSearches(api, paths, out);
     IsdAnalysis(api, paths, out);
     MergeIntoCmyk(api, paths, out);
+    ProofAnalyses(api, paths, out);
     fflush(out);
     return g_failures;
 }
