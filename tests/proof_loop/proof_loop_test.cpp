@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <fstream>
 #include <string>
 
 #include "argyll_tools.h"
@@ -133,3 +134,41 @@ INSTANTIATE_TEST_SUITE_P(Correctors, ProofLoopCorrector,
                          [](const testing::TestParamInfo<Corrector>& info) {
                              return std::string(CorrectorName(info.param));
                          });
+
+// What an operator gets wrong: each stops the loop with a message naming the problem, no pass
+// is reported and nothing crashes.
+TEST(ProofLoop, BadSetUpsStopWithAMessage) {
+    LoopFixture fixture;
+    if (!fixture.skip.empty()) GTEST_SKIP() << fixture.skip;
+    ASSERT_EQ(fixture.model.error, "");
+    TempDir dir;
+    std::ofstream(dir.File("xyz-only.ti3")) << "CTI3\nNUMBER_OF_FIELDS 4\nBEGIN_DATA_FORMAT\nSAMPLE_ID XYZ_X XYZ_Y XYZ_Z\n"
+                                               "END_DATA_FORMAT\nNUMBER_OF_SETS 1\nBEGIN_DATA\n1 96 100 82\nEND_DATA\n";
+    std::ofstream(dir.File("broken.icc")) << "not a profile";
+    struct Variant {
+        const char* name;
+        void (*change)(LoopSettings&, ArgyllTools&, const TempDir&);
+        const char* message;
+    } const variants[] = {
+        {"no xicclu", [](LoopSettings&, ArgyllTools& t, const TempDir&) { t.xicclu.clear(); }, "xicclu is not on PATH"},
+        {"no chart file", [](LoopSettings& s, ArgyllTools&, const TempDir& d) { s.pressTi3 = d.File("none.ti3"); },
+         "no CMYK chart"},
+        {"XYZ-only chart", [](LoopSettings& s, ArgyllTools&, const TempDir& d) { s.pressTi3 = d.File("xyz-only.ti3"); },
+         "no CMYK chart"},
+        {"broken reference", [](LoopSettings& s, ArgyllTools&, const TempDir& d) { s.referenceProfile = d.File("broken.icc"); },
+         "could not evaluate"},
+        {"missing proofer", [](LoopSettings& s, ArgyllTools&, const TempDir& d) { s.prooferProfile = d.File("none.icc"); },
+         "pass 1: xicclu failed"},
+        {"no refine", [](LoopSettings&, ArgyllTools& t, const TempDir&) { t.refine.clear(); }, "refine is not on PATH"},
+    };
+    for (const Variant& v : variants) {
+        SCOPED_TRACE(v.name);
+        LoopSettings settings = fixture.Settings(Corrector::Refine, 2, dir.File("work"));
+        ArgyllTools tools = fixture.tools;
+        v.change(settings, tools, dir);
+        LoopResult result = RunProofLoop(settings, tools);
+        EXPECT_NE(result.error.find(v.message), std::string::npos) << result.error;
+        // Only a failed correction leaves the pass it measured.
+        EXPECT_EQ(result.passes.size(), std::string(v.name) == "no refine" ? 1u : 0u);
+    }
+}
