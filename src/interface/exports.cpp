@@ -15,6 +15,7 @@
 #include "interface/parameter_file.h"
 #include "interface/tool_object.h"
 #include "optimise/merge_into_cmyk.h"
+#include "optimise/optimize1.h"
 #include "support/platform.h"
 
 using vantrel::CIterativtoolDlg;
@@ -98,9 +99,9 @@ VANTREL_API int VANTREL_CALL analyse4(void* handle, const char* paperProfile, co
                              out4);
 }
 
-VANTREL_API int VANTREL_CALL optimize1(void* handle, const char*, int*, int*) {
+VANTREL_API int VANTREL_CALL optimize1(void* handle, const char* paperProfile, int* out1, int* out2) {
     if (!handle) return kNullHandle;
-    return kNotAvailable;
+    return vantrel::Optimize1(*Tool(handle), paperProfile, out1, out2);
 }
 
 VANTREL_API int VANTREL_CALL optimize2(void* handle, const char*, int*, int*, int) {

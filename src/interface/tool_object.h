@@ -82,6 +82,37 @@ public:
     // m_RefName + ".it8" and makes that file the reference measurement (analysis/analyse4.cpp).
     void SimulateReference();
 
+    // ---- optimisation (src/optimise) ------------------------------------------------------------
+    // Results of the output-profile optimisation and its analysis.
+    static constexpr int kOptimiseDone = 1;
+    static constexpr int kOptimiseFailed = 0;       // nothing measured: a table missing (or no memory at first)
+    static constexpr int kOptimiseOutOfMemory = -2;
+
+    // The paper profile's direction-1 table corrected so that it inverts its direction-0 table
+    // more closely: node by node, then sample by sample, each step kept only when the round-trip
+    // error falls. The best state stays in m_Paperprof, m_Score1 and m_Score2. kOptimiseFailed
+    // when the first analysis cannot run (the table and scores are then untouched);
+    // kOptimiseOutOfMemory when a step could not get its memory (that step is undone, the scores
+    // hold the kept state).
+    int OptimizeOutputProfile();
+    // The mean and maximum round-trip error over a 21^4 CMYK grid (0, 12, .. 240). With
+    // m_AbstractOutprof set it measures the paper profile as a device link through m_Refprof and
+    // writes both sides to m_PaperName + "_inputvalues_big.it8" / "_outputvalues_big.it8"; that
+    // needs m_Refprof's direction-0 table (else kOptimiseFailed). Changes no table.
+    int AnalyzeOutputProfile(double& mean, double& max);
+    // Every node of the direction-1 table moved toward what an inverse search finds for the colour
+    // it stands for. 0 (nothing done) unless the table has three inputs and 1..100 grid points.
+    int OptimizeStep1();
+    // Corrections from a 21^4 CMYK sample grid, weighted and spread over the cells the samples fall
+    // in. 0 as OptimizeStep1; kOptimiseOutOfMemory (nothing changed) when the accumulators
+    // cannot be had.
+    int OptimizeStep2();
+    // The wanted paper white for the measurement-driven corrections (m_OptimizeOption 1: the
+    // paper white 3 L* lighter, 2: the measured white; otherwise a target white outside the gamut
+    // is replaced by the nearest of the measured white, the paper white and what the profile
+    // reproduces). 1 when the caller is to stop after this (options 1 and 2), else 0.
+    int ChooseTargetWhite();
+
     // Slot loaders: each loads its slot from the name the tool object holds for it, unless the
     // name is empty or still holds its default label. They report progress and check nothing
     // else: a missing file or tag leaves the slot empty. The caller releases beforehand.
