@@ -35,7 +35,9 @@ int CIterativtoolDlg::OptimizeOutputProfile() {
     if (AnalyzeOutputProfile(keptMean, keptMax) != kOptimiseDone) return kOptimiseFailed;
     m_Score1 = keptMean;
     m_Score2 = keptMax;
+    // The gamut as the relative tables see it, now that the analysis cleared the media-white flags.
     m_Gamut = BuildGamutRecord(*m_Paperprof);
+    m_GamutComputed = true;
 
     int result = kOptimiseDone;
     for (int step = 1; step <= 2; ++step) {

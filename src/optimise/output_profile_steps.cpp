@@ -1,6 +1,5 @@
 // The two corrections of an output profile's PCS-to-device table: node by node, then from a
 // sample grid whose corrections are spread over the cells the samples fall in.
-#include <array>
 #include <cmath>
 
 #include "colour/colour_math.h"
@@ -121,7 +120,7 @@ int CIterativtoolDlg::OptimizeStep2() {
     for (int i = 0; i < n; ++i) Progress(kStep2Text, counter++, steps);
 
     const int channels = DeviceChannels(p);
-    std::array<double, CProfil::kMaxCorners> weights{};
+    CornerWeights weights{};
     for (int pair = 0; pair < kPairs; ++pair) {
         Progress(kStep2Text, counter++, steps);
         for (int yk = 0; yk < kSamples * kSamples; ++yk) {
@@ -149,7 +148,7 @@ int CIterativtoolDlg::OptimizeStep2() {
                 where[0] = first.L * kLightnessScale;
                 where[1] = first.a;
                 where[2] = first.b;
-                g = LocateCell(p, where, 1, weights.data());
+                g = LocateCell(p, where, 1, weights);
             }
             const int i0 = Index(where[0], n), j0 = Index(where[1], n), k0 = Index(where[2], n);
             const bool onNode = g <= kOnNodeAfterSnap;
