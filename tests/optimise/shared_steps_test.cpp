@@ -6,6 +6,7 @@
 
 #include "eval/eval_helpers.h"
 #include "eval/table_nodes.h"
+#include "helpers/tool_handle.h"
 #include "icc/profil.h"
 #include "optimise/add_to_node.h"
 #include "optimise/correction_targets.h"
@@ -112,6 +113,25 @@ TEST(CorrectionTargets, ReflectionsAndShiftsAreHeldToTheLabRange) {
     EXPECT_DOUBLE_EQ(shifted.L, 58.0);
     EXPECT_DOUBLE_EQ(shifted.a, -128.0);
     EXPECT_DOUBLE_EQ(shifted.b, 10.0);
+}
+
+TEST(ChooseTargetWhite, OptionsOneAndTwoSetTheTargetAndAskTheCallerToStop) {
+    ToolHandle handle;
+    CIterativtoolDlg& tool = handle.Tool();
+    tool.m_MeasWhite = {94, 0.5, -2};
+    struct Case {
+        int option;
+        double paperL;
+        Lab expected;
+    };
+    for (const Case& c : {Case{1, 98, {100, 1, -3}}, Case{1, 90, {93, 1, -3}}, Case{2, 90, {94, 0.5, -2}}}) {
+        tool.m_OptimizeOption = c.option;
+        tool.m_PaperWhite = {c.paperL, 1, -3};
+        EXPECT_EQ(tool.ChooseTargetWhite(), 1);
+        EXPECT_DOUBLE_EQ(tool.m_RefWhite.L, c.expected.L);
+        EXPECT_DOUBLE_EQ(tool.m_RefWhite.a, c.expected.a);
+        EXPECT_DOUBLE_EQ(tool.m_RefWhite.b, c.expected.b);
+    }
 }
 
 // The smoothing's progress function: stops at the step `stopAt` (negative: never).
