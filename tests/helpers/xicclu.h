@@ -47,59 +47,52 @@ inline std::vector<std::array<double, 3>> XiccluAbsoluteLab(const std::string& p
     return labs;
 }
 
-// The values xicclu gives for each row (device values on 0..100, Lab as it stands), with the
-// options given ("-ff -ir", "-fb -ir"); empty when xicclu fails.
+// What xicclu gives for each row (device values on 0..100), with `options` ("-ff -ir", "-fb -ir");
+// empty when xicclu fails.
 inline std::vector<std::vector<double>> XiccluRows(const std::string& options, const std::string& profile,
                                                    const std::vector<std::vector<double>>& rows) {
     TempDir dir;
-    {
-        std::ofstream in(dir.File("in.txt"));
-        in.precision(10);
+    std::ofstream(dir.File("in.txt")) << [&] {
+        std::ostringstream text;
+        text.precision(10);
         for (const auto& row : rows) {
-            for (double v : row) in << v << ' ';
-            in << '\n';
+            for (double v : row) text << v << ' ';
+            text << '\n';
         }
-    }
-    const std::string command = "xicclu " + options + " -pl -s 100 '" + profile + "' < '" + dir.File("in.txt") +
-                                "' 2>/dev/null";
+        return text.str();
+    }();
     std::vector<std::vector<double>> out;
+    const std::string command =
+        "xicclu " + options + " -pl -s 100 '" + profile + "' < '" + dir.File("in.txt") + "' 2>/dev/null";
     FILE* pipe = popen(command.c_str(), "r");
-    if (!pipe) return out;
-    char line[1024];
-    while (fgets(line, sizeof line, pipe)) {
-        std::string text(line);
+    for (char line[1024]; pipe && fgets(line, sizeof line, pipe);) {
+        const std::string text(line);
         const size_t arrow = text.rfind("->");
         if (arrow == std::string::npos) continue;
         std::istringstream values(text.substr(arrow + 2, text.find('[', arrow) - arrow - 2));
-        std::vector<double> row;
-        for (double v; values >> v;) row.push_back(v);
-        out.push_back(row);
+        out.emplace_back();
+        for (double v; values >> v;) out.back().push_back(v);
     }
-    pclose(pipe);
+    if (pipe) pclose(pipe);
     if (out.size() != rows.size()) out.clear();
     return out;
 }
 
-// Argyll's round trip of a CMYK output profile over a steps^4 grid (0..100 %): the A2B1 table
-// to Lab, the B2A1 table back to CMYK and the A2B1 table again, all relative colorimetric. The
-// mean CIE 1976 difference, or -1 when xicclu fails.
+// Argyll's round trip of a CMYK output profile over a steps^4 grid (0..100 %): A2B1 to Lab, B2A1
+// back to CMYK, A2B1 again, relative colorimetric. The mean CIE 1976 difference; -1 on failure.
 inline double XiccluRoundTripMean(const std::string& profile, int steps) {
     std::vector<std::vector<double>> grid;
     for (int n = 0; n < steps * steps * steps * steps; ++n) {
-        std::vector<double> cmyk;
-        for (int d = 0, rest = n; d < 4; ++d, rest /= steps) cmyk.push_back(100.0 * (rest % steps) / (steps - 1));
-        grid.push_back(cmyk);
+        grid.emplace_back();
+        for (int d = 0, rest = n; d < 4; ++d, rest /= steps)
+            grid.back().push_back(100.0 * (rest % steps) / (steps - 1));
     }
     const auto first = XiccluRows("-ff -ir", profile, grid);
-    const auto device = XiccluRows("-fb -ir", profile, first);
-    const auto back = XiccluRows("-ff -ir", profile, device);
+    const auto back = XiccluRows("-ff -ir", profile, XiccluRows("-fb -ir", profile, first));
     if (first.empty() || back.empty()) return -1.0;
     double sum = 0.0;
-    for (size_t i = 0; i < first.size(); ++i) {
-        double d2 = 0.0;
-        for (int c = 0; c < 3; ++c) d2 += (first[i][c] - back[i][c]) * (first[i][c] - back[i][c]);
-        sum += std::sqrt(d2);
-    }
+    for (size_t i = 0; i < first.size(); ++i)
+        sum += std::hypot(first[i][0] - back[i][0], first[i][1] - back[i][1], first[i][2] - back[i][2]);
     return sum / static_cast<double>(first.size());
 }
 
