@@ -88,6 +88,18 @@ double LocateCell(CProfil& p, double* record, int slot, CornerWeights& weights) 
     return std::sqrt(sum);
 }
 
+double LocateNearestDeviceNode(CProfil& p, int slot, const double* device, int32_t* indices) {
+    if (!p.SlotHolds(slot) || IsMatrixTrc(p.m_Lut[slot])) return -1.0;
+    const LutView t = SlotView(p, slot);
+    double sum = 0.0;
+    for (int i = 0; i < t.inputs; ++i) {
+        const double g = GridCoordinate(t, i, device[i], false);
+        indices[i] = static_cast<int32_t>(g + 0.5);
+        sum += (g - indices[i]) * (g - indices[i]);
+    }
+    return std::sqrt(sum);
+}
+
 void PlaceLocatedNode(const CProfil& p, double* record, int slot, NodeFields fields) {
     const int n = (slot == 0 || slot == 1) ? p.m_Lut[slot].inputChannels : 0;
     if (n < 1 || n > CProfil::kMaxInputs) return;

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <array>
+#include <cstdint>
 
 #include "icc/profil.h"
 
@@ -26,6 +27,12 @@ double LocateNearestNode(CProfil& profile, double* record, int slot);
 // weights through the weighting polynomial instead. Returns the distance from the cell's first
 // corner in grid units.
 double LocateCell(CProfil& profile, double* record, int slot, CornerWeights& weights);
+
+// The nearest node of a slot whose inputs are device values (a device link), for any input
+// count: three-input links too, which LocateNearestNode would take as a Lab. `device` holds the
+// slot's n inputs on 0..255; the node's indices go to indices[0..n-1]. Returns the distance to
+// it in grid units, or -1 for a slot without a grid.
+double LocateNearestDeviceNode(CProfil& profile, int slot, const double* device, int32_t* indices);
 
 // Which node accessors a located node is meant for: ReadNodeLab, WriteNodeLab and
 // WriteNodeChannelLab read indices from field 4 on; ReadNodeDevice and WriteNodeDevice from

@@ -15,6 +15,7 @@
 #include "interface/parameter_file.h"
 #include "interface/tool_object.h"
 #include "optimise/merge_into_cmyk.h"
+#include "optimise/optimize4.h"
 #include "optimise/optimize1.h"
 #include "support/platform.h"
 
@@ -114,9 +115,10 @@ VANTREL_API int VANTREL_CALL optimize3(void* handle, const char*, int*, int*, in
     return kNotAvailable;
 }
 
-VANTREL_API int VANTREL_CALL optimize4(void* handle, const char*, int*, int*, unsigned short*, const char*, int) {
+VANTREL_API int VANTREL_CALL optimize4(void* handle, const char* outprof3CC, int* out1, int* out2,
+                                       unsigned short* table, const char* paperProfile, int option) {
     if (!handle) return kNullHandle;
-    return kNotAvailable;
+    return vantrel::Optimize4(*Tool(handle), outprof3CC, out1, out2, table, paperProfile, option);
 }
 
 VANTREL_API int VANTREL_CALL mergeMCHintoCMYK(void* handle, const char* refProfile, const char* paperProfile,

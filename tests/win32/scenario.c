@@ -486,6 +486,77 @@ static void OptimizeOutputProfile(const VantrelApi* api, const ScenarioPaths* pa
 }
 /* ---- end optimize1 -------------------------------------------------------------------------- */
 
+/* ---- optimize4 ------------------------------------------------------------------------------
+ * Two calibration runs through a copy of the identity link, each analysed by analyse3 and then
+ * corrected by optimize4 with FOGRA39L as the printer model; then optimize4 on a copy of the
+ * neutral Lab table, whose 33-point table also fills the host's buffer. */
+static void DigestWords(FILE* out, const char* label, const unsigned short* words, size_t count) {
+    Digest d;
+    DigestReset(&d);
+    for (size_t i = 0; i < count; ++i) {
+        unsigned char be[2] = {(unsigned char)(words[i] >> 8), (unsigned char)(words[i] & 0xFF)};
+        DigestBytes(&d, be, 2);
+    }
+    fprintf(out, "  %s words=%lu digest=", label, (unsigned long)count);
+    PrintDigest(out, &d);
+    fputc('\n', out);
+}
+
+static void LinkCorrection(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
+    enum { kBufferWords = 13 + 3 * 33 * 33 * 33 };
+    unsigned short* buffer = (unsigned short*)malloc(kBufferWords * sizeof(unsigned short));
+    char* link = CopyToWork(paths, paths->work, "cmyk2cmyk5neutral.mcc", "o4-link.mcc");
+    char* neutral = CopyToWork(paths, paths->work, "neutral.3cc", "o4-neutral.3cc");
+    char* model = Join(paths->fixtures, "FOGRA39L.icc");
+    char* chart = WriteWork(paths, "o4-chart.it8",
+                            PROOF_FIELDS "1 0 0 0 0 95 0 -2\n2 50 25 0 0 52 28 -20\n3 25 0 0 0 80 -15 -20\n"
+                                         "4 0 100 100 0 47 68 48\n5 0 0 0 50 64 0 0\nEND_DATA\n");
+    char* run1 = WriteWork(paths, "o4_cal1.it8",
+                           PROOF_FIELDS "1 0 0 0 0 95 0 -2\n2 50 25 0 0 49 31 -24\n3 25 0 0 0 77 -17 -22\n"
+                                        "4 0 100 100 0 45 70 45\n5 0 0 0 50 62 0 0\nEND_DATA\n");
+    char* run2 = WriteWork(paths, "o4_cal2.it8",
+                           PROOF_FIELDS "1 0 0 0 0 95 0 -2\n2 50 25 0 0 51 29 -21\n3 25 0 0 0 79 -16 -21\n"
+                                        "4 0 100 100 0 46 69 47\n5 0 0 0 50 63 0 0\nEND_DATA\n");
+    void* handle = buffer && link && neutral && model && chart && run1 && run2
+                       ? ProofHandle(paths, api, "optimize4 calibration runs", out)
+                       : NULL;
+    if (handle) {
+        const char* runs[2] = {run1, run2};
+        for (int r = 0; r < 2; ++r) {
+            int out1 = UNTOUCHED, out2 = UNTOUCHED;
+            int rc = api->analyse3(handle, "", link, chart, runs[r], &out1, &out2);
+            fprintf(out, "analyse3(o4-link.mcc, calibration run %d) = %d out %d %d\n", r + 1, rc, out1, out2);
+            ProgressLine(out);
+            out1 = out2 = UNTOUCHED;
+            rc = api->optimize4(handle, link, &out1, &out2, buffer, model, 1);
+            fprintf(out, "optimize4(o4-link.mcc, FOGRA39L.icc, run %d) = %d out %d %d\n", r + 1, rc, out1, out2);
+            ProgressLine(out);
+            FileLine(out, paths->work, "o4-link.mcc");
+        }
+        fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+        handle = ProofHandle(paths, api, "optimize4 on a Lab table", out);
+    }
+    if (handle) {
+        for (int k = 0; k < kBufferWords; ++k) buffer[k] = 0xEEEE;
+        int out1 = UNTOUCHED, out2 = UNTOUCHED;
+        int rc = api->optimize4(handle, neutral, &out1, &out2, buffer, "", 0);
+        fprintf(out, "optimize4(o4-neutral.3cc) = %d out %d %d\n", rc, out1, out2);
+        ProgressLine(out);
+        DigestWords(out, "buffer", buffer, kBufferWords);
+        Check(rc == 0 && buffer[0] == 33, "optimize4 fills the buffer for a three-input table");
+        fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+    }
+    free(buffer);
+    free(link);
+    free(neutral);
+    free(model);
+    free(chart);
+    free(run1);
+    free(run2);
+}
+
+/* ---- end of optimize4 ---------------------------------------------------------------------- */
+
 int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     g_failures = 0;
     DigestReset(&g_progress);
@@ -497,6 +568,7 @@ int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     MergeIntoCmyk(api, paths, out);
     ProofAnalyses(api, paths, out);
     OptimizeOutputProfile(api, paths, out); /* optimize1 block */
+    LinkCorrection(api, paths, out);        /* optimize4 block */
     fflush(out);
     return g_failures;
 }

@@ -1,0 +1,173 @@
+// optimize4: calibration runs of a device link through analyse3 and optimize4, measured with a
+// printer that lcms2 evaluates.
+#include <gtest/gtest.h>
+#include <lcms2.h>
+
+#include <cmath>
+#include <filesystem>
+#include <sstream>
+
+#include "colour/colour_math.h"
+#include "helpers/cgats_files.h"
+#include "helpers/icc_builder.h"
+#include "helpers/multi_ink_profiles.h"
+#include "helpers/test_paths.h"
+#include "helpers/tool_handle.h"
+
+using namespace vantrel;
+using namespace vantrel::test;
+
+namespace {
+
+// A chart of the link's 5-point grid: every C, M, Y of 0, 25 .. 100 %, once without black and
+// once with 50 % black (those never move the link).
+std::vector<std::array<int, 4>> GridChart() {
+    std::vector<std::array<int, 4>> chart;
+    for (int k : {0, 50})
+        for (int c = 0; c <= 100; c += 25)
+            for (int m = 0; m <= 100; m += 25)
+                for (int y = 0; y <= 100; y += 25) chart.push_back({c, m, y, k});
+    return chart;
+}
+
+// Colours through lcms2, absolute colorimetric: a profile's A2B, optionally behind a link.
+class Printer {
+public:
+    Printer(const std::string& profile, const std::string& link) {
+        lab_ = cmsCreateLab4Profile(nullptr);
+        cmsHPROFILE device = cmsOpenProfileFromFile(profile.c_str(), "r");
+        if (link.empty()) {
+            transform_ = cmsCreateTransform(device, TYPE_CMYK_DBL, lab_, TYPE_Lab_DBL, INTENT_ABSOLUTE_COLORIMETRIC, 0);
+        } else {
+            cmsHPROFILE chain[3] = {cmsOpenProfileFromFile(link.c_str(), "r"), device, lab_};
+            cmsUInt32Number intents[3] = {INTENT_PERCEPTUAL, INTENT_ABSOLUTE_COLORIMETRIC, INTENT_ABSOLUTE_COLORIMETRIC};
+            cmsBool bpc[3] = {0, 0, 0};
+            cmsFloat64Number adapt[3] = {1, 1, 1};
+            transform_ = cmsCreateExtendedTransform(nullptr, 3, chain, bpc, intents, adapt, nullptr, 0, TYPE_CMYK_DBL,
+                                                    TYPE_Lab_DBL, cmsFLAGS_NOOPTIMIZE);
+            cmsCloseProfile(chain[0]);
+        }
+        cmsCloseProfile(device);
+    }
+    ~Printer() {
+        if (transform_) cmsDeleteTransform(transform_);
+        cmsCloseProfile(lab_);
+    }
+    bool Ok() const { return transform_ != nullptr; }
+    cmsCIELab operator()(const std::array<int, 4>& percent) const {
+        const double in[4] = {double(percent[0]), double(percent[1]), double(percent[2]), double(percent[3])};
+        cmsCIELab out;
+        cmsDoTransform(transform_, in, &out, 1);
+        return out;
+    }
+
+private:
+    cmsHPROFILE lab_;
+    cmsHTRANSFORM transform_ = nullptr;
+};
+
+// The chart as a measurement file, colours from `print`.
+std::string ChartFile(const TempDir& dir, const std::string& name, const Printer& print) {
+    std::vector<std::string> rows;
+    int id = 1;
+    for (const auto& p : GridChart()) {
+        const cmsCIELab lab = print(p);
+        std::ostringstream row;
+        row << id++ << ' ' << p[0] << ' ' << p[1] << ' ' << p[2] << ' ' << p[3] << ' ' << lab.L << ' ' << lab.a << ' '
+            << lab.b;
+        rows.push_back(row.str());
+    }
+    return WriteText(dir, name, Cgats("SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B", rows));
+}
+
+// Mean colour difference of the black-free patches between two charts' colours.
+double MeanError(const Printer& reference, const Printer& proof) {
+    double sum = 0;
+    int count = 0;
+    for (const auto& p : GridChart()) {
+        if (p[3] != 0) continue;
+        const cmsCIELab a = reference(p), b = proof(p);
+        sum += DeltaE(a.L, a.a, a.b, b.L, b.a, b.b);
+        ++count;
+    }
+    return sum / count;
+}
+
+}  // namespace
+
+// Three calibration runs of the CMYK identity link with a TR003 printer against FOGRA39L data:
+// the printer's colours come closer to the reference run by run (3.6, 2.3, 2.0, 2.0 here); nodes
+// with black and the black output never move.
+TEST(Optimize4, CalibrationRunsBringThePrinterCloserToTheReference) {
+    const std::string reference = FixtureProfile("FOGRA39L"), printer = FixtureProfile("TR003");
+    if (reference.empty() || printer.empty()) GTEST_SKIP() << "FOGRA39L or TR003 fixture not built";
+    TempDir dir;
+    ToolHandle tool(dir.Slash().c_str());
+    const std::string link = dir.File("link.mcc");
+    std::filesystem::copy_file(dir.File("cmyk2cmyk5neutral.mcc"), link);
+    const Printer press(reference, "");
+    const std::string ref = ChartFile(dir, "press.it8", press);
+    CProfil before;
+    before.ReadTagTable(1, link);
+    ASSERT_EQ(before.LoadLut(1, "A2B0", link), 1);
+
+    double error = MeanError(press, Printer(printer, link));
+    std::vector<uint16_t> buffer(4096, 0xEEEE);
+    for (int run = 1; run <= 3; ++run) {
+        const Printer proof(printer, link);
+        ASSERT_TRUE(proof.Ok());
+        const std::string meas = ChartFile(dir, "proof_cal" + std::to_string(run) + ".it8", proof);
+        int out[2];
+        ASSERT_EQ(analyse3(tool.h, printer.c_str(), link.c_str(), ref.c_str(), meas.c_str(), &out[0], &out[1]), 0);
+        ASSERT_EQ(optimize4(tool.h, link.c_str(), &out[0], &out[1], buffer.data(), printer.c_str(), 1), 0);
+        EXPECT_EQ(tool.Tool().m_CalRun, run);
+        const double now = MeanError(press, Printer(printer, link));
+        std::printf("[ optimize4] calibration run %d: mean dE76 at the corrected nodes %.2f -> %.2f\n", run, error, now);
+        EXPECT_LE(now, error + 0.01) << "run " << run;
+        if (run == 1) {
+            EXPECT_LT(now, error - 0.5);
+        }
+        error = now;
+    }
+    EXPECT_EQ(buffer, std::vector<uint16_t>(4096, 0xEEEE));  // a four-input link has no buffer layout
+
+    CProfil after;
+    after.ReadTagTable(1, link);
+    ASSERT_EQ(after.LoadLut(1, "A2B0", link), 1);
+    const size_t nodes = after.m_Clut[1].size() / 4;
+    for (size_t node = 0; node < nodes; ++node) {
+        const bool withBlack = node % 5 != 0;  // black is the last input: fastest index
+        for (size_t c = 0; c < 4; ++c)
+            if (withBlack || c == 3) {
+                ASSERT_EQ(after.m_Clut[1][4 * node + c], before.m_Clut[1][4 * node + c]) << node;
+            }
+    }
+}
+
+// Links that cannot be corrected leave their files loadable and say so.
+TEST(Optimize4, BadLinksAndProfilesGiveACleanResult) {
+    TempDir dir;
+    const std::string text = Cgats("SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B", {"1 0 0 0 0 95 0 0", "2 50 0 0 0 60 -30 -40"});
+    const std::string broken = WriteFile(dir.File("broken.mcc"), Bytes(300, 7));
+    const struct {
+        const char* what;
+        std::string link;
+        int result;
+    } cases[] = {
+        {"no name", "", -1},
+        {"missing link", dir.File("absent.mcc"), 2},
+        {"broken link", broken, 2},
+        {"seven-colourant link without measurements", "cmykrgb2cmykrgb5neutral.mcc", 0},
+    };
+    for (const auto& c : cases) {
+        ToolHandle tool(dir.Slash().c_str());
+        const std::string link = c.link.empty() || c.link[0] == '/' ? c.link : dir.File(c.link);
+        const Bytes before = ReadFile(link);
+        int out[2] = {0, 0};
+        EXPECT_EQ(optimize4(tool.h, link.c_str(), &out[0], &out[1], nullptr, "", 1), c.result) << c.what;
+        if (!link.empty()) {
+            EXPECT_EQ(ReadFile(link), before) << c.what;
+        }
+    }
+    EXPECT_EQ(optimize4(nullptr, "", nullptr, nullptr, nullptr, "", 0), 1);
+}
