@@ -27,6 +27,7 @@ TEST(TableNodes, LabWritesClampAStarTouchOneChannelAndHoldIndicesToTheGrid) {
     WriteNodeLab(p, record, 0);
     const int32_t node = p.m_ClutStride[0][0] + 2 * p.m_ClutStride[0][1] + p.m_ClutStride[0][3];
     EXPECT_EQ(p.m_Clut[0][node + 1], 0);
+    EXPECT_EQ(p.m_Clut[0][node + 2], 65407);  // b* 127 encodes to 65406.5: rounded, not truncated
     ReadNodeLab(p, record, 0, true);
     EXPECT_NEAR(record[1], -127.5, 1e-9);
 
