@@ -269,7 +269,8 @@ TEST(RealProfiles, GamutRecordHoldsTheColoursTheProfileWasBuiltFrom) {
         if (r.path.empty() || r.measurements.empty()) continue;
         SCOPED_TRACE(r.name);
         CProfil p;
-        ASSERT_TRUE(LoadProfile(p, r.path, "A2B1", r.b2a, true));  // measurements are absolute
+        // Measurements are absolute; the lattice is compared through lcms2's relative transform.
+        ASSERT_TRUE(LoadProfile(p, r.path, "A2B1", r.b2a, !r.matrixTrc));
         const GamutRecord g = BuildGamutRecord(p);
         EXPECT_EQ(g.valid, 1);
         if (r.matrixTrc) {

@@ -1,6 +1,6 @@
 #pragma once
 // The real profiles of the profile-level checks, declared once: what each file is, what it
-// exercises that the others do not, and the fault that brought it in. Each check walks the entries
+// exercises that the others do not, and the fault it is there to catch. Each check walks the entries
 // that carry its numbers (a zero limit leaves an entry out); a file not installed or not built is
 // skipped.
 
@@ -24,7 +24,7 @@ struct RealProfile {
     std::string path;  // empty when the file is not installed or not built
     const char* what;
     const char* exercises;
-    const char* fault;
+    const char* fault;  // a fault only this entry shows, or the one it was kept for
     const char* b2a;  // "B2A0" for a profile with intent-0 tables only (A2B1 falls back to A2B0 itself)
     bool matrixTrc;
     Limits forward, inverse;
@@ -73,7 +73,7 @@ inline const std::vector<RealProfile>& ProfileCorpus() {
          "v4 tables read at the wrong offsets",
          "B2A0", false, {0, 0}, {0, 0}, 0, 0, "", false},
         {"sRGB", Installed("sRGB.icc"), "icc-profiles-free's sRGB", "matrix/TRC, 1024-entry curves",
-         "the colorant matrix or its inverse applied transposed",
+         "the inverse matrix applied transposed; an RGB profile given the empty gamut record",
          "B2A1", true, {0.3, 1.5}, {0.6, 4.0}, 0, 0, "lattice", true},
         {"AdobeRGB", Installed("compatibleWithAdobeRGB1998.icc"), "icc-profiles-free's Adobe RGB",
          "matrix/TRC, gamma curves", "a u8Fixed8 gamma read with the wrong scale",
