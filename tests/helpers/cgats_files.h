@@ -99,7 +99,4 @@ inline PlainTable ParsePlain(const std::string& path) {
     return table;
 }
 
-// Runs a shell command quietly; true when it exited with 0.
-inline bool RunQuietly(const std::string& command) { return std::system((command + " >/dev/null 2>&1").c_str()) == 0; }
-
 }  // namespace vantrel::test
