@@ -149,7 +149,7 @@ TEST(ConstrainedSearch, RefusedColourantPairsAreNeverAnswered) {
 }
 
 TEST(RangedSearch, ReachesPressColoursAndReportsTheErrorOfItsAnswer) {
-    const std::string path = FixtureProfile("FOGRA39L");
+    const std::string path = CorpusProfile("FOGRA39L").path;
     if (path.empty()) GTEST_SKIP() << "FOGRA39L.icc not built";
     CProfil p;
     ASSERT_TRUE(LoadProfile(p, path));

@@ -1,7 +1,7 @@
 #pragma once
 
-// Shared by the evaluation tests: real profiles loaded into CProfil, lcms2 as the oracle that
-// evaluates the same tags, and small profiles with tables of known functions for exact cases.
+// Shared by the evaluation tests: real profiles loaded into CProfil, and small profiles with tables
+// of known functions for exact cases. lcms2, the oracle, is in helpers/lcms_oracle.h.
 #include <gtest/gtest.h>
 #include <lcms2.h>
 
@@ -17,6 +17,8 @@
 #include "colour/colour_values.h"
 #include "eval/forward.h"
 #include "helpers/icc_builder.h"
+#include "helpers/lcms_oracle.h"
+#include "helpers/profile_corpus.h"
 #include "helpers/test_paths.h"
 #include "icc/profil.h"
 
@@ -30,12 +32,6 @@ inline bool LoadProfile(CProfil& p, const std::string& path, const char* a2b = "
     const bool forward = p.LoadLut(0, a2b, path) == 1;
     p.ReadTagTable(1, path);
     return p.LoadLut(1, b2a, path) == 1 && forward;
-}
-
-// A system profile by its name below the ICC directory; empty when it is not installed.
-inline std::string SystemProfile(const std::string& name) {
-    const std::string path = SystemIccDir() + name;
-    return std::filesystem::exists(path) ? path : std::string();
 }
 
 // A profile of data colour space `space` (Lab PCS) holding `tags`, written into `dir` under a
@@ -91,38 +87,6 @@ inline Lab CmykLab(CProfil& p, const double* device) {
 
 inline double Difference(const Lab& x, const Lab& y) {
     return std::sqrt((x.L - y.L) * (x.L - y.L) + (x.a - y.a) * (x.a - y.a) + (x.b - y.b) * (x.b - y.b));
-}
-
-// A device-to-Lab or Lab-to-device transform of lcms2 on the profile's own tables (no
-// optimisation, so that it interpolates the tags themselves); null when lcms2 cannot make it.
-using LcmsTransform = std::unique_ptr<void, decltype(&cmsDeleteTransform)>;
-inline LcmsTransform MakeLcmsTransform(const std::string& path, cmsUInt32Number deviceFormat, bool toLab,
-                                       cmsUInt32Number intent = INTENT_RELATIVE_COLORIMETRIC) {
-    cmsHPROFILE device = cmsOpenProfileFromFile(path.c_str(), "r");
-    cmsHPROFILE lab = cmsCreateLab2Profile(nullptr);
-    const cmsUInt32Number flags = cmsFLAGS_NOOPTIMIZE | cmsFLAGS_NOCACHE;
-    cmsHTRANSFORM t = nullptr;
-    if (device && lab)
-        t = toLab ? cmsCreateTransform(device, deviceFormat, lab, TYPE_Lab_DBL, intent, flags)
-                  : cmsCreateTransform(lab, TYPE_Lab_DBL, device, deviceFormat, intent, flags);
-    if (device) cmsCloseProfile(device);  // a transform keeps what it needs of its profiles
-    if (lab) cmsCloseProfile(lab);
-    return LcmsTransform(t, &cmsDeleteTransform);
-}
-
-// Device values (0..255) to Lab and back through lcms2, which takes CMYK in percent, RGB on 0..1.
-inline Lab OracleLab(const LcmsTransform& t, const double* device, int channels) {
-    double in[4];
-    for (int c = 0; c < channels; ++c) in[c] = device[c] / (channels == 4 ? 2.55 : 255.0);
-    cmsCIELab out;
-    cmsDoTransform(t.get(), in, &out, 1);
-    return Lab{out.L, out.a, out.b};
-}
-inline void OracleDevice(const LcmsTransform& t, const Lab& lab, double* device, int channels) {
-    const cmsCIELab in{lab.L, lab.a, lab.b};
-    double out[4];
-    cmsDoTransform(t.get(), &in, out, 1);
-    for (int c = 0; c < channels; ++c) device[c] = out[c] * (channels == 4 ? 2.55 : 255.0);
 }
 
 // Mean and largest difference of a comparison, printed for the record.

@@ -1,8 +1,6 @@
-// Forward evaluation: real profiles against lcms2 on the same tags, and the decoding, kernel
-// choice and media-white cases on small tables of known values.
+// Forward evaluation: the decoding, kernel choice and media-white cases on small tables of known
+// values (real profiles against lcms2: real_profiles_test.cpp).
 #include <gtest/gtest.h>
-
-#include <random>
 
 #include "eval/forward.h"
 #include "eval/inverse.h"
@@ -12,63 +10,6 @@ namespace vantrel {
 namespace {
 
 using namespace test;
-
-// The two differ only where the interpolation schemes differ: lcms2 interpolates four-input
-// tables as tetrahedra in CMY blended along K, and applies output curves after the grid.
-TEST(ForwardEvaluation, RealProfilesAgreeWithLcmsOnTheSameTables) {
-    struct Case {
-        const char* name;
-        std::string path;
-        const char* a2b;
-        cmsUInt32Number intent;
-        double meanLimit, maxLimit;
-    };
-    const Case cases[] = {
-        {"FOGRA39L A2B1", FixtureProfile("FOGRA39L"), "A2B1", INTENT_RELATIVE_COLORIMETRIC, 0.5, 3.0},
-        {"TR003 A2B1", FixtureProfile("TR003"), "A2B1", INTENT_RELATIVE_COLORIMETRIC, 0.8, 5.0},
-        {"default_cmyk A2B1", SystemProfile("ghostscript/default_cmyk.icc"), "A2B1", INTENT_RELATIVE_COLORIMETRIC,
-         0.5, 3.0},
-        // XYZ PCS and only A2B0, which A2B1 falls back to, as in lcms2. Its five-point grid is far
-        // from linear (a* swings by 120 across one cell), where a four-input simplex and lcms2's
-        // CMY tetrahedra blended along K part by up to 30 between the nodes; on the nodes they agree.
-        {"ps_cmyk (XYZ) A2B0", SystemProfile("ghostscript/ps_cmyk.icc"), "A2B1", INTENT_RELATIVE_COLORIMETRIC, 1.5,
-         35.0},
-        {"sRGB (matrix/TRC)", SystemProfile("sRGB.icc"), "A2B1", INTENT_RELATIVE_COLORIMETRIC, 0.3, 1.5},
-        {"AdobeRGB (matrix/TRC)", SystemProfile("compatibleWithAdobeRGB1998.icc"), "A2B1",
-         INTENT_RELATIVE_COLORIMETRIC, 0.3, 1.5},
-    };
-    int tested = 0;
-    for (const Case& c : cases) {
-        if (c.path.empty()) continue;
-        ++tested;
-        CProfil p;
-        p.ReadTagTable(0, c.path);
-        ASSERT_EQ(p.LoadLut(0, c.a2b, c.path), 1) << c.name;
-        const int channels = p.m_Lut[0].type == "MATR" ? 3 : 4;
-        const auto oracle = MakeLcmsTransform(c.path, channels == 3 ? TYPE_RGB_DBL : TYPE_CMYK_DBL, true, c.intent);
-        ASSERT_TRUE(oracle) << c.name;
-        // Every node of a 9-point lattice, then random colours.
-        std::vector<std::vector<double>> samples;
-        for (int k = 0; k < std::pow(9, channels); ++k) {
-            std::vector<double> s(4, 0.0);
-            for (int i = 0, rest = k; i < channels; ++i, rest /= 9) s[i] = rest % 9 * 31.875;
-            samples.push_back(s);
-        }
-        std::mt19937 rng(7);
-        std::uniform_real_distribution<double> value(0, 255);
-        for (int i = 0; i < 3000; ++i) samples.push_back({value(rng), value(rng), value(rng), value(rng)});
-        DeltaStats stats;
-        for (const auto& s : samples) {
-            double v[4] = {s[0], s[1], s[2], s[3]};
-            EXPECT_EQ(channels == 3 ? RgbToLab(p, v) : CmykToLab(p, v), 1);
-            stats.Add(Difference(Lab{v[0] / 2.55, v[1], v[2]}, OracleLab(oracle, s.data(), channels)));
-        }
-        stats.Report(std::string(c.name) + " to Lab vs lcms2");
-        EXPECT_LT(stats.Mean(), c.meanLimit) << c.name;
-        EXPECT_LT(stats.max, c.maxLimit) << c.name;
-    }
-    if (tested == 0) GTEST_SKIP() << "no real profiles available";
-}
 
 TEST(ForwardEvaluation, ColourantCountAndColourSpaceChooseTheEvaluation) {
     // Direction 1: out0 = 255 f1 f2; at fractions (x, 0.5, 0.5) the multilinear kernel gives 63.75,

@@ -1,75 +1,15 @@
-// The gamut record of real profiles against the measurements they were built from, and the
-// look-up rules of the in-gamut test.
+// The look-up rules of the in-gamut test and the empty record (real profiles against the colours
+// they were built from: real_profiles_test.cpp).
 #include <gtest/gtest.h>
-
-#include <chrono>
 
 #include "colour/colour_math.h"
 #include "eval/gamut_record.h"
 #include "eval_helpers.h"
-#include "it8/measured_it8.h"
 
 namespace vantrel {
 namespace {
 
 using namespace test;
-
-TEST(GamutRecord, PressProfilesHoldTheColoursTheyWereBuiltFrom) {
-    int tested = 0;
-    for (const char* name : {"FOGRA39L", "TR003"}) {
-        const std::string path = FixtureProfile(name);
-        // The measured colours, read as the library reads measurements.
-        Measured_IT8 it8;
-        if (path.empty() || it8.ReadIt8(SystemIccDir() + name + ".ti3") != 0 || it8.PatchCount() == 0) continue;
-        ++tested;
-        CProfil p;
-        ASSERT_TRUE(LoadProfile(p, path, "A2B1", "B2A1", true));  // measurements are absolute
-        const auto begin = std::chrono::steady_clock::now();
-        const GamutRecord g = BuildGamutRecord(p);
-        const double seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - begin).count();
-        EXPECT_EQ(g.valid, 1);
-        EXPECT_NEAR(g.paperWhite[0], p.WhiteL(0), 1e-12);
-        int inside = 0;
-        for (int set = 0; set < it8.PatchCount(); ++set)
-            inside += IsInGamut(g, it8.GetLab(set, 0), it8.GetLab(set, 1), it8.GetLab(set, 2));
-        const double share = double(inside) / it8.PatchCount();
-        std::printf("[ gamut    ] %-10s %4d of %4d measured colours inside (%.1f %%), built in %.3f s\n", name, inside,
-                    it8.PatchCount(), 100 * share, seconds);
-        EXPECT_GE(share, 0.9) << name;
-        // A measured colour inside the gamut is reproduced closely; one far outside is not.
-        const Lab first = ReproducedLab(p, it8.GetLab(0, 0), it8.GetLab(0, 1), it8.GetLab(0, 2));
-        EXPECT_LT(Difference(first, Lab{it8.GetLab(0, 0), it8.GetLab(0, 1), it8.GetLab(0, 2)}), 2.0) << name;
-        EXPECT_GT(Difference(ReproducedLab(p, 50, 100, 90), Lab{50, 100, 90}), 10.0) << name;
-        // Far outside any press: saturated RGB-primary colours, and lighter than the paper.
-        for (const Lab& lab :
-             {Lab{50, 100, 90}, Lab{88, -90, 10}, Lab{30, 60, -110}, Lab{99, 0, 0}, Lab{60, -100, -60}})
-            EXPECT_FALSE(IsInGamut(g, lab.L, lab.a, lab.b)) << name << " " << lab.L;
-    }
-    if (tested == 0) GTEST_SKIP() << "press profiles not built";
-}
-
-TEST(GamutRecord, MatrixRgbProfileHoldsItsLattice) {
-    const std::string path = SystemProfile("sRGB.icc");
-    if (path.empty()) GTEST_SKIP();
-    CProfil p;
-    ASSERT_TRUE(LoadProfile(p, path));
-    const GamutRecord g = BuildGamutRecord(p);
-    const auto forward = MakeLcmsTransform(path, TYPE_RGB_DBL, true);
-    // Inner colours are inside; of the surface ones, where the cell's largest chroma decides, most are.
-    int inside[2] = {0, 0}, total[2] = {0, 0};
-    for (int k = 0; k < 216; ++k) {
-        const double rgb[3] = {k / 36 * 51.0, k / 6 % 6 * 51.0, k % 6 * 51.0};
-        const Lab lab = OracleLab(forward, rgb, 3);
-        const bool surface = *std::min_element(rgb, rgb + 3) == 0 || *std::max_element(rgb, rgb + 3) == 255;
-        inside[surface] += IsInGamut(g, lab.L, lab.a, lab.b);
-        ++total[surface];
-    }
-    std::printf("[ gamut    ] sRGB       inner lattice %d of %d inside, surface %d of %d\n", inside[0], total[0],
-                inside[1], total[1]);
-    EXPECT_EQ(inside[0], total[0]);
-    EXPECT_GE(inside[1], total[1] * 3 / 4);
-    EXPECT_FALSE(IsInGamut(g, 50, -110, -110));
-}
 
 TEST(GamutRecord, OtherColourSpacesGiveTheEmptyRecordThatHoldsNothing) {
     TempDir dir;

@@ -2,6 +2,8 @@
 // Measurement files for the reader, writer and analysis tests: written byte for byte, read back
 // as text, and parsed independently of the library's own CGATS reader.
 
+#include <algorithm>
+#include <cctype>
 #include <cstdlib>
 #include <fstream>
 #include <sstream>
@@ -63,9 +65,17 @@ struct PlainTable {
     std::vector<std::vector<std::string>> rows;
     int announcedSets = -1;
 
+    // Field names compare as the library's reader compares them, ignoring case ("Lab_L" as the
+    // library writes it, "LAB_L" as data files have it).
     int Column(const std::string& name) const {
+        auto same = [&name](const std::string& field) {
+            return field.size() == name.size() &&
+                   std::equal(field.begin(), field.end(), name.begin(), [](char a, char b) {
+                       return std::toupper(static_cast<unsigned char>(a)) == std::toupper(static_cast<unsigned char>(b));
+                   });
+        };
         for (std::size_t i = 0; i < fields.size(); ++i)
-            if (fields[i] == name) return static_cast<int>(i);
+            if (same(fields[i])) return static_cast<int>(i);
         return -1;
     }
     double Value(std::size_t row, int column) const {
@@ -98,8 +108,5 @@ inline PlainTable ParsePlain(const std::string& path) {
     }
     return table;
 }
-
-// Runs a shell command quietly; true when it exited with 0.
-inline bool RunQuietly(const std::string& command) { return std::system((command + " >/dev/null 2>&1").c_str()) == 0; }
 
 }  // namespace vantrel::test

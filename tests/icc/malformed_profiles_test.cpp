@@ -9,7 +9,8 @@
 #include "helpers/icc_builder.h"
 #include "helpers/test_paths.h"
 #include "icc/profil.h"
-#include "lcms_oracle.h"
+#include "helpers/lcms_oracle.h"
+#include "helpers/profile_corpus.h"
 
 using namespace vantrel;
 using namespace vantrel::test;
@@ -154,14 +155,11 @@ TEST(MalformedProfiles, TheReasonNamesWhatWasWrong) {
 // Real profiles cut at every few hundred bytes and with random bytes in the tag table and the
 // table heads: nothing may crash, read outside the file or allocate without bound.
 TEST(MalformedProfiles, CorruptedRealProfiles) {
-    std::vector<std::string> corpus = {SystemIccDir() + "ghostscript/default_cmyk.icc",
-                                       SystemIccDir() + "ghostscript/ps_cmyk.icc", SystemIccDir() + "sRGB.icc"};
-    if (const std::string tr003 = FixtureProfile("TR003"); !tr003.empty()) corpus.push_back(tr003);
     TempDir dir;
     std::mt19937 random(2024);
-    for (const std::string& source : corpus) {
-        if (!std::filesystem::exists(source)) continue;
-        const Bytes good = ReadFile(source);
+    for (const RealProfile& source : ProfileCorpus()) {
+        if (source.path.empty() || !source.corrupt) continue;
+        const Bytes good = ReadFile(source.path);
         for (size_t cut = 0; cut < good.size(); cut += 1 + good.size() / 40)
             Load(WriteFile(dir.File("cut.icc"), Bytes(good.begin(), good.begin() + static_cast<std::ptrdiff_t>(cut))));
         const size_t count = GetU32(good, 128);

@@ -6,7 +6,7 @@
 #include "helpers/icc_builder.h"
 #include "helpers/test_paths.h"
 #include "icc/profil.h"
-#include "lcms_oracle.h"
+#include "helpers/profile_corpus.h"
 
 using namespace vantrel;
 using namespace vantrel::test;
@@ -62,7 +62,7 @@ TEST(WriteClut, UnchangedTablesRewriteIdenticallyAndOneNodeChangesOnlyItsBytes) 
          1, "B2A1", cmsSigBToA1Tag},
     };
     ASSERT_TRUE(WriteLcmsV4Profile(dir.File("v4.icc")));
-    if (const std::string fogra = FixtureProfile("FOGRA39L"); !fogra.empty()) {
+    if (const std::string fogra = CorpusProfile("FOGRA39L").path; !fogra.empty()) {
         std::filesystem::copy_file(fogra, dir.File("fogra.icc"));
         cases.push_back({dir.File("fogra.icc"), 0, "A2B1", cmsSigAToB1Tag});
     }
@@ -184,7 +184,7 @@ TEST(ExportClut3, WritesEveryTableButFillsTheBufferForThreeInputsOnly) {
     EXPECT_EQ(ReadWithLcms(path, cmsSigAToB0Tag).clut.at(5), 4321);
     EXPECT_EQ(buffer, std::vector<uint16_t>(4096, 0xEEEE));
 
-    const std::string srgb = SystemIccDir() + "sRGB.icc";
+    const std::string srgb = CorpusProfile("sRGB").path;
     if (!std::filesystem::exists(srgb)) return;
     std::filesystem::copy_file(srgb, dir.File("srgb.icc"));
     const Bytes before = ReadFile(dir.File("srgb.icc"));

@@ -253,30 +253,6 @@ TEST(CgatsReaderFailures, WhatIsNotARegularFileCannotBeOpened) {
     }
 }
 
-TEST(CgatsReaderFailures, TruncationAtEveryLineOfARealFile) {
-    const std::string path = SystemIccDir() + "TR002.ti3";
-    if (!std::filesystem::exists(path)) GTEST_SKIP() << path << " missing";
-    const std::string text = ReadText(path);
-    const std::size_t endData = text.rfind("END_DATA");
-    TempDir dir;
-    Measured_IT8 it8;
-    int lines = 0;
-    // Every line end, and every byte from END_DATA on.
-    for (std::size_t cut = 0; cut <= text.size(); ++cut) {
-        if (cut < endData && text[cut] != '\n') continue;
-        ++lines;
-        const int result = it8.ReadIt8(WriteText(dir, "cut.ti3", text.substr(0, cut)));
-        if (cut >= endData + 8) {
-            EXPECT_EQ(result, 0) << "cut at " << cut;
-            EXPECT_EQ(it8.PatchCount(), 928);
-        } else {
-            EXPECT_LT(result, 0) << "cut at " << cut;
-            EXPECT_EQ(it8.PatchCount(), 0);
-        }
-    }
-    EXPECT_GT(lines, 900);
-}
-
 TEST(CgatsReaderFailures, BinaryGarbageEndsInACode) {
     std::mt19937 random(1234);
     TempDir dir;

@@ -1,14 +1,19 @@
 #pragma once
-// lcms2 as the oracle of the ICC tests: the tables of a LUT tag as lcms2 decodes them, and a v4
-// profile of "mAB "/"mBA " tables written by lcms2.
+// lcms2, the one oracle of the profile tests: the tables of a LUT tag as lcms2 decodes them, the
+// tag's pipeline evaluated at table inputs, transforms on a profile's own tables, and a v4 profile
+// of "mAB "/"mBA " tables written by lcms2.
 
 #include <lcms2.h>
 #include <lcms2_plugin.h>
 
+#include <algorithm>
 #include <cmath>
+#include <cstdio>
 #include <memory>
 #include <string>
 #include <vector>
+
+#include "colour/colour_values.h"
 
 namespace vantrel::test {
 
@@ -91,6 +96,61 @@ inline bool WriteLcmsV4Profile(const std::string& path) {
     cmsPipelineFree(backward);
     cmsCloseProfile(profile);
     return ok;
+}
+
+// A device-to-Lab or Lab-to-device transform of lcms2 on the profile's own tables (no
+// optimisation, so that it interpolates the tags themselves); null when lcms2 cannot make it.
+using LcmsTransform = std::unique_ptr<void, decltype(&cmsDeleteTransform)>;
+inline LcmsTransform MakeLcmsTransform(const std::string& path, cmsUInt32Number deviceFormat, bool toLab,
+                                       cmsUInt32Number intent = INTENT_RELATIVE_COLORIMETRIC) {
+    cmsHPROFILE device = cmsOpenProfileFromFile(path.c_str(), "r");
+    cmsHPROFILE lab = cmsCreateLab2Profile(nullptr);
+    const cmsUInt32Number flags = cmsFLAGS_NOOPTIMIZE | cmsFLAGS_NOCACHE;
+    cmsHTRANSFORM t = nullptr;
+    if (device && lab)
+        t = toLab ? cmsCreateTransform(device, deviceFormat, lab, TYPE_Lab_DBL, intent, flags)
+                  : cmsCreateTransform(lab, TYPE_Lab_DBL, device, deviceFormat, intent, flags);
+    if (device) cmsCloseProfile(device);  // a transform keeps what it needs of its profiles
+    if (lab) cmsCloseProfile(lab);
+    return LcmsTransform(t, &cmsDeleteTransform);
+}
+
+// Device values (0..255) to Lab and back through lcms2, which takes CMYK in percent, RGB on 0..1.
+inline Lab OracleLab(const LcmsTransform& t, const double* device, int channels) {
+    double in[4];
+    for (int c = 0; c < channels; ++c) in[c] = device[c] / (channels == 4 ? 2.55 : 255.0);
+    cmsCIELab out;
+    cmsDoTransform(t.get(), in, &out, 1);
+    return Lab{out.L, out.a, out.b};
+}
+inline void OracleDevice(const LcmsTransform& t, const Lab& lab, double* device, int channels) {
+    const cmsCIELab in{lab.L, lab.a, lab.b};
+    double out[4];
+    cmsDoTransform(t.get(), &in, out, 1);
+    for (int c = 0; c < channels; ++c) device[c] = out[c] * (channels == 4 ? 2.55 : 255.0);
+}
+
+// A Lab-to-device tag's own pipeline as lcms2 reads it (input curves, grid, output curves, and the
+// matrix of an XYZ table), evaluated at the table inputs a Lab stands for: L* / 100 and
+// (a* + 127.5) / 255 for a 16-bit Lab table, (a* + 128) / 255 for an 8-bit one, XYZ / 1.99997 for
+// an XYZ one. Four device values on 0..255.
+inline void OracleTable(cmsPipeline* pipeline, const Lab& lab, bool xyz, bool eightBit, double* device) {
+    float in[3], out[8];
+    if (xyz) {
+        const cmsCIELab l{lab.L, lab.a, lab.b};
+        cmsCIEXYZ v;
+        cmsLab2XYZ(cmsD50_XYZ(), &v, &l);
+        in[0] = float(v.X * 32768.0 / 65535.0);
+        in[1] = float(v.Y * 32768.0 / 65535.0);
+        in[2] = float(v.Z * 32768.0 / 65535.0);
+    } else {
+        const double half = eightBit ? 128.0 : 127.5;
+        in[0] = float(lab.L / 100.0);
+        in[1] = float((lab.a + half) / 255.0);
+        in[2] = float((lab.b + half) / 255.0);
+    }
+    cmsPipelineEvalFloat(in, out, pipeline);
+    for (int k = 0; k < 4; ++k) device[k] = out[k] * 255.0;
 }
 
 }  // namespace vantrel::test
