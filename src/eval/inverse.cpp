@@ -118,7 +118,10 @@ void LabToDevice(CProfil& p, double* v, int channels) {
 double* InverseSearch(CProfil& p, double L, double a, double b, const double* start, double* result,
                       double& deltaE) {
     const double target[3] = {L, a, b};
-    int channels = p.m_Lut[1].outputChannels;
+    // The forward evaluation takes as many channels as the direction-0 table has inputs. (The
+    // direction-1 table's outputs say the same for an output profile, but not for a printer model
+    // loaded with its forward table in both slots, whose slot 1 gives three Lab outputs.)
+    int channels = p.m_Lut[0].inputChannels;
     if (channels < 1) channels = 4;
     double w[CProfil::kEvalSize] = {start[0], start[1], start[2], start[3]};
     const double startDelta = DeltaTo(p, target, w, channels);
