@@ -96,8 +96,8 @@ TEST(MeasuredCorrection, OnePatchMovesItsNodeOrItsCornersByTheStepFactor) {
             for (int n = 0; n < 27; ++n) {
                 const int i = n / 9, j = n / 3 % 3, k = n % 3;
                 double move = !cell && n == 13 ? 0.75 * error : 0.0;
-                const int corner = (i - 1) << 2 | (j - 1) << 1 | (k - 1);  // the cell's lower corner is (1, 1, 1)
-                if (cell && i >= 1 && j >= 1 && k >= 1) move = 0.6 * w[corner] * error;
+                // The cell's lower corner is (1, 1, 1).
+                if (cell && i >= 1 && j >= 1 && k >= 1) move = 0.6 * w[(i - 1) * 4 + (j - 1) * 2 + (k - 1)] * error;
                 // Corners barely inside the cell take cube roots of tiny fractions: a little slack.
                 EXPECT_NEAR((out.m_Clut[1][4 * n] - before[4 * n]) / 257.0, move, 0.03) << "node " << n;
             }
