@@ -16,6 +16,7 @@
 #include "interface/tool_object.h"
 #include "optimise/merge_into_cmyk.h"
 #include "optimise/optimize4.h"
+#include "optimise/measured_corrections.h"
 #include "optimise/optimize1.h"
 #include "support/platform.h"
 
@@ -105,14 +106,14 @@ VANTREL_API int VANTREL_CALL optimize1(void* handle, const char* paperProfile, i
     return vantrel::Optimize1(*Tool(handle), paperProfile, out1, out2);
 }
 
-VANTREL_API int VANTREL_CALL optimize2(void* handle, const char*, int*, int*, int) {
+VANTREL_API int VANTREL_CALL optimize2(void* handle, const char* outProfile, int* out1, int* out2, int option) {
     if (!handle) return kNullHandle;
-    return kNotAvailable;
+    return vantrel::Optimize2(*Tool(handle), outProfile, out1, out2, option);
 }
 
-VANTREL_API int VANTREL_CALL optimize3(void* handle, const char*, int*, int*, int) {
+VANTREL_API int VANTREL_CALL optimize3(void* handle, const char* outprof3CC, int* out1, int* out2, int option) {
     if (!handle) return kNullHandle;
-    return kNotAvailable;
+    return vantrel::Optimize3(*Tool(handle), outprof3CC, out1, out2, option);
 }
 
 VANTREL_API int VANTREL_CALL optimize4(void* handle, const char* outprof3CC, int* out1, int* out2,

@@ -113,6 +113,22 @@ public:
     // reproduces). 1 when the caller is to stop after this (options 1 and 2), else 0.
     int ChooseTargetWhite();
 
+    // Corrections from a measured proof: the measurements and whites that analyse4 left.
+    // The direction-1 media white of the paper profile moved toward the measured paper (options
+    // other than 1 and 2; sets m_WriteExtra when it moved). 0 for a table outside 1..100 points.
+    int CorrectPaperWhite();
+    // The paper profile's direction-1 table corrected patch by patch from the reference and the
+    // measured proof. 1 when done or when the files do not pair (nothing done); 0 for a table
+    // outside 1..100 points, a reference without device columns or a stop request (what was
+    // applied stays); kOptimiseOutOfMemory when the accumulators cannot be had (table unchanged).
+    int OptimizeFromMeasurement();
+    // Every node of the 3CC's direction-1 table carried part of the way from the measured paper
+    // white to the wanted one. 0 for a table outside 1..100 points or a stop request, else 1.
+    int CorrectOutprofWhite();
+    // The 3CC's direction-1 table corrected in Lab from the measured proof, then the nodes no patch
+    // reached smoothed (cell mode). Results as OptimizeFromMeasurement.
+    int OptimizeOutprof();
+
     // Slot loaders: each loads its slot from the name the tool object holds for it, unless the
     // name is empty or still holds its default label. They report progress and check nothing
     // else: a missing file or tag leaves the slot empty. The caller releases beforehand.

@@ -556,6 +556,42 @@ static void LinkCorrection(const VantrelApi* api, const ScenarioPaths* paths, FI
 }
 
 /* ---- end of optimize4 ---------------------------------------------------------------------- */
+/* ---- optimize2 and optimize3 (corrections from a measured proof) ----------------------------
+ * analyse4 leaves a FOGRA40L measurement against the FOGRA39L reference in the tool object, then
+ * optimize2 writes a corrected copy of TR003.icc (colprof -ql) and optimize3 corrects a copy of
+ * the identity 3CC. Each job has a fresh handle and works on copies. */
+static void MeasuredCorrectionJob(const VantrelApi* api, const ScenarioPaths* paths, int three, FILE* out) {
+    const char* job = three ? "optimize3" : "optimize2";
+    char* ref = CopyToWork(paths, paths->colour, "FOGRA39L.ti3", three ? "opt3-ref.ti3" : "opt2-ref.ti3");
+    char* meas = CopyToWork(paths, paths->colour, "FOGRA40L.ti3", three ? "opt3-meas.ti3" : "opt2-meas.ti3");
+    char* paper = CopyToWork(paths, paths->fixtures, "TR003.icc", three ? "opt3-paper.icc" : "opt2-paper.icc");
+    char* refProfile = CopyToWork(paths, paths->fixtures, "FOGRA39L.icc", three ? "opt3-ref.icc" : "opt2-ref.icc");
+    void* handle = ref && meas && paper && refProfile ? ProofHandle(paths, api, job, out) : NULL;
+    char* target = three ? CopyToWork(paths, paths->work, "neutral.3cc", "opt3-correction.3cc")
+                         : Join(paths->work, "opt2-out.icc");
+    if (!handle || !target) {
+        fprintf(out, "%s: FOGRA data or fixture missing\n", job);
+    } else {
+        int o[4] = {UNTOUCHED, UNTOUCHED, UNTOUCHED, UNTOUCHED};
+        int rc = api->analyse4(handle, paper, refProfile, ref, meas, &o[0], &o[1], &o[2], &o[3]);
+        fprintf(out, "analyse4(for %s) = %d out %d %d %d %d\n", job, rc, o[0], o[1], o[2], o[3]);
+        ProgressLine(out);
+        int out1 = UNTOUCHED, out2 = UNTOUCHED;
+        rc = three ? api->optimize3(handle, target, &out1, &out2, 0) : api->optimize2(handle, target, &out1, &out2, 0);
+        fprintf(out, "%s = %d out %d %d\n", job, rc, out1, out2);
+        ProgressLine(out);
+        Check(rc == 0 && out1 == 255000 && out2 == 300000, three ? "optimize3 corrects the 3CC copy"
+                                                                 : "optimize2 writes the corrected copy");
+        FileLine(out, paths->work, three ? "opt3-correction.3cc" : "opt2-out.icc");
+    }
+    if (handle) fprintf(out, "dllFree = %d\n", api->dllFree(handle));
+    free(ref);
+    free(meas);
+    free(paper);
+    free(refProfile);
+    free(target);
+}
+/* ---- end optimize2 and optimize3 ------------------------------------------------------------ */
 
 int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     g_failures = 0;
@@ -569,6 +605,8 @@ int RunScenario(const VantrelApi* api, const ScenarioPaths* paths, FILE* out) {
     ProofAnalyses(api, paths, out);
     OptimizeOutputProfile(api, paths, out); /* optimize1 block */
     LinkCorrection(api, paths, out);        /* optimize4 block */
+    MeasuredCorrectionJob(api, paths, 0, out); /* optimize2 and optimize3 block */
+    MeasuredCorrectionJob(api, paths, 1, out);
     fflush(out);
     return g_failures;
 }
