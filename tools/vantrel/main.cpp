@@ -53,7 +53,6 @@ int main(int argc, char** argv) {
             return kFailed;
         }
     }
-    std::fprintf(stderr, "vantrel: unknown command \"%s\"\n", first.c_str());
-    Overview(stderr);
+    std::fprintf(stderr, "vantrel: unknown command \"%s\" (vantrel --help lists the commands)\n", first.c_str());
     return kUsage;
 }

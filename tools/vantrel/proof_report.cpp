@@ -300,6 +300,18 @@ std::string RenderReport(const ReportInput& in) {
       << "</code><br>Proof: <code>" << Escape(in.proofName) << "</code><br>Patches compared: " << in.patches.size()
       << "</p>\n";
 
+    if (!in.passes.empty() || !in.loopNote.empty()) {
+        h << "<h2>Proof loop</h2>\n";
+        if (!in.loopNote.empty()) h << "<p id=\"loop-note\">" << Escape(in.loopNote) << "</p>\n";
+        h << "<table id=\"passes\"><tr><th>Pass</th><th>Mean dE76</th><th>p95</th><th>Maximum</th><th>Paper</th>"
+             "<th>Correction (s)</th></tr>\n";
+        for (const LoopPass& p : in.passes)
+            h << "<tr><td>" << p.pass << "</td><td>" << Fixed(p.mean) << "</td><td>" << Fixed(p.p95) << "</td><td>"
+              << Fixed(p.maximum) << "</td><td>" << Fixed(p.paper) << "</td><td>"
+              << (p.seconds < 0 ? "-" : Fixed(p.seconds, 1)) << "</td></tr>\n";
+        h << "</table>\n";
+        if (!in.passes.empty()) h << "<figure>" << LoopPlot(in.passes) << "<figcaption>Mean dE76 by pass</figcaption></figure>\n";
+    }
     if (in.figures.present) {
         h << "<h2>The four figures</h2>\n<table id=\"figures\"><tr><th class=\"l\">Figure</th><th>Value</th></tr>\n"
           << "<tr><td class=\"l\">Mean colour difference</td><td>" << Fixed(in.figures.mean) << "</td></tr>\n"
@@ -343,18 +355,6 @@ std::string RenderReport(const ReportInput& in) {
           << "</td><td>" << Fixed(p->dE2000) << "</td><td>" << Fixed(p->dH) << "</td></tr>\n";
     h << "</table>\n";
 
-    if (!in.passes.empty() || !in.loopNote.empty()) {
-        h << "<h2>Proof loop</h2>\n";
-        if (!in.loopNote.empty()) h << "<p id=\"loop-note\">" << Escape(in.loopNote) << "</p>\n";
-        h << "<table id=\"passes\"><tr><th>Pass</th><th>Mean dE76</th><th>p95</th><th>Maximum</th><th>Paper</th>"
-             "<th>Correction (s)</th></tr>\n";
-        for (const LoopPass& p : in.passes)
-            h << "<tr><td>" << p.pass << "</td><td>" << Fixed(p.mean) << "</td><td>" << Fixed(p.p95) << "</td><td>"
-              << Fixed(p.maximum) << "</td><td>" << Fixed(p.paper) << "</td><td>"
-              << (p.seconds < 0 ? "-" : Fixed(p.seconds, 1)) << "</td></tr>\n";
-        h << "</table>\n";
-        if (!in.passes.empty()) h << "<figure>" << LoopPlot(in.passes) << "<figcaption>Mean dE76 by pass</figcaption></figure>\n";
-    }
     h << "</body></html>\n";
     return h.str();
 }
