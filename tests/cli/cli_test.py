@@ -169,6 +169,16 @@ elif GROUP == "errors":
         check(r.returncode == status, f"{args}: exit {r.returncode}, expected {status}")
         check(says in r.stderr and r.stderr.count("\n") <= 2 and r.stdout == "", f"{args}: stderr {r.stderr!r}")
     check(open("tr.icc", "rb").read() == before, "a refused command changed its input")
+    # Ctrl-C: optimize1 hears it through the progress answer; the half-made copy goes away.
+    import signal, time
+    p = subprocess.Popen([VANTREL, "improve", "tr.icc", "--out", "cut.icc", "--quiet"], stderr=subprocess.PIPE, text=True)
+    time.sleep(0.5)
+    p.send_signal(signal.SIGINT)
+    err = p.communicate(timeout=120)[1]
+    if p.returncode == 0:
+        print("note: improve finished before Ctrl-C reached it")
+    else:
+        check(p.returncode == 1 and "interrupted" in err and not os.path.exists("cut.icc"), f"Ctrl-C: {p.returncode} {err}")
 
 elif GROUP in ("report", "loop"):
     if GROUP == "report":

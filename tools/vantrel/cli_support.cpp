@@ -195,6 +195,21 @@ std::string OutputCopy(const Args& args, const std::string& input) {
     return out;
 }
 
+OutputFile::OutputFile(const Args& args, const std::string& input) {
+    m_Keep = args.Has("--in-place");
+    m_Path = OutputCopy(args, input);
+}
+
+OutputFile::OutputFile(const std::string& path) : m_Path(path) {
+    std::error_code error;
+    m_Keep = fs::exists(path, error);
+}
+
+OutputFile::~OutputFile() {
+    std::error_code ignored;
+    if (!m_Keep) fs::remove(m_Path, ignored);
+}
+
 std::string JsonString(const std::string& text) {
     std::string out = "\"";
     for (unsigned char c : text) {

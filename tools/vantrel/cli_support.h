@@ -72,6 +72,22 @@ void RequireChart(const std::string& path, bool needDevice, bool needColour);
 // Where a command writes: `out`, or the input itself with --in-place. Refuses to overwrite the
 // input without --in-place; copies the input to out (when they differ) so the library works on it.
 std::string OutputCopy(const Args& args, const std::string& input);
+// The file a command writes: removed again when the command fails or is interrupted before
+// Keep(), unless it is the input itself (--in-place) or was there before.
+class OutputFile {
+public:
+    OutputFile(const Args& args, const std::string& input);
+    explicit OutputFile(const std::string& path);  // a new file the library writes itself
+    ~OutputFile();
+    OutputFile(const OutputFile&) = delete;
+    OutputFile& operator=(const OutputFile&) = delete;
+    const std::string& Path() const { return m_Path; }
+    void Keep() { m_Keep = true; }
+
+private:
+    std::string m_Path;
+    bool m_Keep = false;
+};
 void CopyFile(const std::string& from, const std::string& to);
 
 // A flat JSON object, written on one line.

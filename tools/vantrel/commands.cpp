@@ -376,21 +376,18 @@ int Correct(int argc, char** argv) {
     Session session(args.Has("--quiet"));
     const Judged judged = RunAnalyse4(session, proofProfile, refProfile, proof, args.Get("--reference"));
     int out1 = 0, out2 = 0, result;
-    std::string written;
-    if (threeCc) {
-        written = OutputCopy(args, args.Get("--3cc"));
-        result = optimize3(session.Handle(), written.c_str(), &out1, &out2, option);
-    } else {
-        written = args.Get("--out");
-        std::error_code error;
-        if (fs::exists(written, error) && fs::equivalent(written, proofProfile, error))
-            UsageError(written + ": is the proofer profile; write the correction to a new file");
-        result = optimize2(session.Handle(), written.c_str(), &out1, &out2, option);
-    }
+    std::error_code error;
+    if (!threeCc && fs::exists(args.Get("--out"), error) && fs::equivalent(args.Get("--out"), proofProfile, error))
+        UsageError(args.Get("--out") + ": is the proofer profile; write the correction to a new file");
+    OutputFile output = threeCc ? OutputFile(args, args.Get("--3cc")) : OutputFile(args.Get("--out"));
+    const std::string& written = output.Path();
+    if (threeCc) result = optimize3(session.Handle(), written.c_str(), &out1, &out2, option);
+    else result = optimize2(session.Handle(), written.c_str(), &out1, &out2, option);
     session.CheckInterrupted();
     const char* name = threeCc ? "optimize3" : "optimize2";
     if (result == -1) Fail(std::string(name) + " is not available in this build of the library");
     if (result != 0) Fail(written + ": " + name + " failed (result " + std::to_string(result) + ")");
+    output.Keep();
     if (args.Has("--json"))
         Print(Json().AddRaw("before", FiguresJson(judged.figures)).Add("output", written).Text() + "\n");
     else {
@@ -408,7 +405,8 @@ int Improve(int argc, char** argv) {
     const std::string profile = args.At(0, "PROFILE");
     RequireProfile(profile, "A2B1");
     RequireProfile(profile, "B2A1");
-    const std::string out = OutputCopy(args, profile);
+    OutputFile output(args, profile);
+    const std::string& out = output.Path();
     Session session(args.Has("--quiet"));
     int mean = 0, maximum = 0;
     const int result = optimize1(session.Handle(), out.c_str(), &mean, &maximum);
@@ -416,6 +414,7 @@ int Improve(int argc, char** argv) {
     static const char* kWhy[] = {"", "", "a table to measure is missing", "the file cannot take the table back",
                                  "a step ran out of memory"};
     if (result != 0) Fail(out + ": " + (result >= 2 && result <= 4 ? kWhy[result] : "optimize1 failed"));
+    output.Keep();
     if (args.Has("--json"))
         Print(Json().Add("round_trip_mean", FromHost(mean)).Add("round_trip_maximum", FromHost(maximum)).Add("output", out).Text() + "\n");
     else {
@@ -439,7 +438,8 @@ int Calibrate(int argc, char** argv) {
     RequireChart(measurement, true, true);
     if (!reference.empty()) RequireChart(reference, true, true);
     if (!paper.empty()) RequireProfile(paper);
-    const std::string out = OutputCopy(args, link);
+    OutputFile output(args, link);
+    const std::string& out = output.Path();
     Session session(args.Has("--quiet"));
     // The measurement's name carries the calibration run ("_cal<N>"), so the copy keeps it.
     const std::string meas = session.CopyIn(measurement);
@@ -453,6 +453,7 @@ int Calibrate(int argc, char** argv) {
     if (result == 2) Fail(out + ": the link's table could not be loaded");
     if (result == 3) Fail(out + ": the file cannot take the corrected table back");
     if (result != 0) Fail(out + ": optimize4 failed (result " + std::to_string(result) + ")");
+    output.Keep();
     if (args.Has("--json"))
         Print(Json().Add("mean", FromHost(mean)).Add("maximum", FromHost(maximum)).Add("output", out).Text() + "\n");
     else {
