@@ -87,6 +87,19 @@ if GROUP == "subcommands":
     run("convert", PROFILE, "--in", "conv.csv", "--out", "conv.it8")
     check(len(read_cgats("conv.it8")) == 1617, "convert CSV in, CGATS out")
 
+    # RGB through sRGB (absolute, as Argyll's xicclu -ia gives it); CMYK+RGB through a seven-colour profile.
+    srgb = f"{ICC}/sRGB.icc"
+    if os.path.exists(srgb) and shutil.which("xicclu"):
+        rgb = json.loads(run("convert", srgb, "--rgb", "255,0,0", "0,0,255", "128,128,128", "--json").stdout)
+        x = subprocess.run(["xicclu", "-v0", "-ff", "-ia", "-pl", srgb], input="1 0 0\n0 0 1\n0.50196 0.50196 0.50196\n",
+                           capture_output=True, text=True).stdout.split()
+        for i, rec in enumerate(rgb):
+            check(de76(rec["lab"], [float(v) for v in x[3 * i:3 * i + 3]]) < 0.5, f"convert --rgb {rec}: xicclu {x}")
+    if os.path.exists(f"{FIXTURES}/ink-7CLR.icc"):
+        seven = json.loads(run("convert", f"{FIXTURES}/ink-7CLR.icc", "--cmykrgb", "0,0,0,0,0,0,0", "100,0,0,0,0,0,0",
+                               "--json").stdout)
+        check(seven[0]["lab"][0] > seven[1]["lab"][0] + 10, f"convert --cmykrgb: cyan no darker than paper {seven}")
+
     # inks: the CMYK found prints the Lab asked for (checked through xicclu when it is there).
     inks = json.loads(run("inks", PROFILE, "60", "-20", "-30", "--json").stdout)["cmyk"]
     if shutil.which("xicclu"):
@@ -147,6 +160,7 @@ elif GROUP == "errors":
     open("lab-only.it8", "w").write(
         "CGATS.17\nNUMBER_OF_FIELDS 4\nBEGIN_DATA_FORMAT\nSAMPLE_ID LAB_L LAB_A LAB_B\nEND_DATA_FORMAT\n"
         "NUMBER_OF_SETS 1\nBEGIN_DATA\n1 95 0 -2\nEND_DATA\n")
+    open("three.csv", "w").write("C;M;Y;K\n0;0;100\n")
     shutil.copy(f"{FIXTURES}/TR003.icc", "tr.icc")
     cases = [  # arguments, exit status, what stderr must say
         (["convert", "missing.icc", "1,2,3,4"], 1, "missing.icc: no such file"),
@@ -155,6 +169,7 @@ elif GROUP == "errors":
         (["convert", PROFILE, "--in", "lab-only.it8"], 1, "lab-only.it8: chart has no device columns"),
         (["judge", PROFILE, PROFILE, "lab-only.it8"], 1, "lab-only.it8: chart has no device columns"),
         (["compare", "missing.ti3"], 1, "missing.ti3: no such file"),
+        (["convert", PROFILE, "--in", "three.csv"], 1, "three.csv: line 2: 3 values, 4 device values needed"),
         (["convert", PROFILE, "1,2,x"], 2, "not a list of numbers"),
         (["convert", PROFILE, "1,2,3"], 2, "4 device values"),
         (["inks", PROFILE, "50"], 2, "missing L* a* b*"),
