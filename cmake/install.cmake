@@ -28,22 +28,28 @@ write_basic_package_version_file(${CMAKE_BINARY_DIR}/VantrelConfigVersion.cmake 
 install(FILES ${CMAKE_BINARY_DIR}/VantrelConfig.cmake ${CMAKE_BINARY_DIR}/VantrelConfigVersion.cmake
   DESTINATION ${VANTREL_CMAKE_DIR} COMPONENT dev)
 
-# Two Debian packages, as for other libraries: libvantrel0 (what a host needs at run time) and
-# libvantrel-dev (what building a host needs), so that hosts can ship the runtime alone.
+# Three Debian packages, as for other libraries: libvantrel0 (what a host needs at run time),
+# libvantrel-dev (what building a host needs), so that hosts can ship the runtime alone, and
+# vantrel (the command and its man page, tools/vantrel), which can be left out of a host's
+# installation and does not tie the command's path to one soname.
 set(CPACK_PACKAGE_NAME vantrel)
 set(CPACK_PACKAGE_VENDOR "Vantrel")
 set(CPACK_PACKAGE_CONTACT "Vantrel developers <vantrel@localhost>")
 set(CPACK_PACKAGE_DESCRIPTION_SUMMARY "Colour management for proofing")
 set(CPACK_PACKAGE_VERSION ${PROJECT_VERSION})
 set(CPACK_DEB_COMPONENT_INSTALL ON)
-set(CPACK_COMPONENTS_ALL runtime dev)
+set(CPACK_COMPONENTS_ALL runtime dev cli)
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_NAME libvantrel${PROJECT_VERSION_MAJOR})
 set(CPACK_DEBIAN_DEV_PACKAGE_NAME libvantrel-dev)
+set(CPACK_DEBIAN_CLI_PACKAGE_NAME vantrel)
+set(CPACK_DEBIAN_CLI_PACKAGE_SECTION graphics)
+set(CPACK_DEBIAN_CLI_PACKAGE_SHLIBDEPS ON)
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_DEV_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_SHLIBDEPS ON)
 set(CPACK_DEBIAN_DEV_PACKAGE_DEPENDS "libvantrel${PROJECT_VERSION_MAJOR} (= ${PROJECT_VERSION})")
 set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
 set(CPACK_COMPONENT_RUNTIME_DESCRIPTION "Vantrel shared library: ICC profile conversions, proof analyses and profile corrections for proofing")
+set(CPACK_COMPONENT_CLI_DESCRIPTION "Vantrel command line: conversions, proof judging with an HTML report, profile corrections")
 set(CPACK_COMPONENT_DEV_DESCRIPTION "Vantrel development files: vantrel.h, pkg-config and CMake package files")
 include(CPack)

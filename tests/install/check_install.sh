@@ -30,4 +30,7 @@ cp "$here/CMakeLists.txt.in" "$scratch/cmake-host/CMakeLists.txt"
 cmake -S "$scratch/cmake-host" -B "$scratch/cmake-host/build" -DCMAKE_PREFIX_PATH="$prefix" >"$scratch/cmake.log"
 cmake --build "$scratch/cmake-host/build" >>"$scratch/cmake.log"
 LD_LIBRARY_PATH="$libdir" "$scratch/cmake-host/build/tiny_host"
-echo "installed tree usable with pkg-config and CMake"
+# The command and its man page come with the runtime.
+"$prefix/bin/vantrel" --version | grep -q "^vantrel " || { echo "FAILED: no working bin/vantrel"; exit 1; }
+[ -s "$prefix/share/man/man1/vantrel.1" ] || { echo "FAILED: no man page"; exit 1; }
+echo "installed tree usable with pkg-config and CMake; bin/vantrel and its man page in place"
