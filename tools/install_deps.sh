@@ -2,7 +2,8 @@
 # Installs what building and testing need on a Debian machine, when run as root
 # and something is missing. Without root it only says what is missing.
 set -eu
-packages="cmake g++ make pkg-config libgtest-dev libbenchmark-dev liblcms2-dev liblcms2-utils argyll icc-profiles-free colord-data libgs-common"
+# python3 runs the command-line tests, chromium renders their proof report.
+packages="cmake g++ make pkg-config libgtest-dev libbenchmark-dev liblcms2-dev liblcms2-utils argyll icc-profiles-free colord-data libgs-common python3 chromium"
 # make demo needs only the compiler, CMake, Argyll and the FOGRA data (install_deps.sh --demo).
 demo_only=""
 if [ "${1:-}" = "--demo" ]; then
