@@ -43,13 +43,7 @@ void AlignInOrderOf(const CIterativtoolDlg& tool, const Measured_IT8& order, std
         PatchRecord& record = records[static_cast<std::size_t>(i)];
         record.sampleNumber = static_cast<uint32_t>(i + 1);
         for (int c = 0; c < channels; ++c) record.device[c] = std::trunc(target[static_cast<std::size_t>(c)] + 0.5);
-        record.lab[0] = lab.L;
-        record.lab[1] = lab.a;
-        record.lab[2] = lab.b;
-        const XYZ xyz = tool.LabToXYZ(lab.L, lab.a, lab.b);
-        record.xyz[0] = xyz.X;
-        record.xyz[1] = xyz.Y;
-        record.xyz[2] = xyz.Z;
+        tool.SetRecordColour(record, lab);
     }
     tool.Progress(kFinished, 1, 1);
 

@@ -49,13 +49,7 @@ void CIterativtoolDlg::IsdAnalysis() {
 
         record.sampleNumber = static_cast<uint32_t>(i + 1);
         for (int c = 0; c < 4; ++c) record.device[c] = WholePercent(m_MeasIT8->GetCmyk(i, c));
-        record.lab[0] = converted.L;
-        record.lab[1] = converted.a;
-        record.lab[2] = converted.b;
-        const XYZ xyz = LabToXYZ(converted.L, converted.a, converted.b);
-        record.xyz[0] = xyz.X;
-        record.xyz[1] = xyz.Y;
-        record.xyz[2] = xyz.Z;
+        SetRecordColour(record, converted);
     }
 
     const std::string outName = m_MeasIT8Name + kIsdSuffix;

@@ -59,7 +59,7 @@ void CIterativtoolDlg::SimulateReference() {
     const It8Kind kind = ProbeIt8Kind(*m_MeasIT8, kScanProbePatch);
     const int channels = ComparedChannels(kind);
     if (channels == 0 || !TakesChannels(*m_Refprof, channels)) return;
-    const double scale = kind.device == It8Kind::kRgb ? 1.0 : 2.55;
+    const double scale = kind.device == It8Kind::kRgb ? 1.0 : kPercentToDevice;
 
     std::vector<PatchRecord> records(static_cast<std::size_t>(n));
     for (int i = 0; i < n; ++i) {
@@ -78,13 +78,7 @@ void CIterativtoolDlg::SimulateReference() {
         record.kind = static_cast<uint32_t>(channels);
         record.sampleNumber = static_cast<uint32_t>(i + 1);
         for (int c = 0; c < channels; ++c) record.device[c] = std::trunc(device[static_cast<std::size_t>(c)] + 0.5);
-        record.lab[0] = values[0] / 2.55;
-        record.lab[1] = values[1];
-        record.lab[2] = values[2];
-        const XYZ xyz = LabToXYZ(record.lab[0], record.lab[1], record.lab[2]);
-        record.xyz[0] = xyz.X;
-        record.xyz[1] = xyz.Y;
-        record.xyz[2] = xyz.Z;
+        SetRecordColour(record, Lab{values[0] / kLightnessScale, values[1], values[2]});
     }
 
     const std::string name = m_RefName + kSimulatedSuffix;

@@ -52,7 +52,7 @@ DeviceKey LinkDevice(const Measured_IT8& it8, const It8Kind& kind, int patch) {
 class LinkCorrection {
 public:
     LinkCorrection(CProfil* link, const It8Kind& kind) : link_(link), channels_(ComparedChannels(kind)) {
-        scale_ = kind.device == It8Kind::kRgb ? 1.0 : 2.55;
+        scale_ = kind.device == It8Kind::kRgb ? 1.0 : kPercentToDevice;
         usable_ = link_ && link_->SlotHolds(1) && channels_ >= 4 && link_->m_Lut[1].inputChannels == channels_ &&
                   link_->m_Lut[1].outputChannels == channels_;
     }
@@ -93,19 +93,9 @@ public:
 private:
     CProfil* link_;
     int channels_;
-    double scale_ = 2.55;
+    double scale_ = kPercentToDevice;
     bool usable_ = false;
 };
-
-void SetColour(const CIterativtoolDlg& tool, PatchRecord& record, const Lab& lab) {
-    record.lab[0] = lab.L;
-    record.lab[1] = lab.a;
-    record.lab[2] = lab.b;
-    const XYZ xyz = tool.LabToXYZ(lab.L, lab.a, lab.b);
-    record.xyz[0] = xyz.X;
-    record.xyz[1] = xyz.Y;
-    record.xyz[2] = xyz.Z;
-}
 
 bool SameKind(const It8Kind& p, const It8Kind& q) {
     return p.device == q.device && (p.device != It8Kind::kMultiChannel || p.seventhChannel == q.seventhChannel);
@@ -200,7 +190,7 @@ AnalysisFigures CIterativtoolDlg::MergedAnalysis() {
                 link.ReadNode(node, record.device);
             }
         }
-        SetColour(*this, record, colour);
+        SetRecordColour(record, colour);
     }
     Progress(kFinished, 1, 1);
 

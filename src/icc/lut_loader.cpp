@@ -86,6 +86,22 @@ std::string CutSignature(std::string value) {
     return value;
 }
 
+// The counts a table reader works with, in 64 bits.
+struct TableCounts {
+    uint64_t inputs, outputs;
+    uint64_t heldEntries;  // per input curve as held (256 or more)
+    uint64_t fileEntries;  // per input curve in the file
+    uint64_t outputEntries;
+    uint64_t clutValues;   // grid^inputs x outputs
+};
+
+TableCounts Counts(const LutSlot& lut, int fileInputEntries) {
+    const uint64_t m = static_cast<uint64_t>(lut.outputChannels);
+    return {static_cast<uint64_t>(lut.inputChannels), m, static_cast<uint64_t>(lut.inputEntries),
+            static_cast<uint64_t>(fileInputEntries), static_cast<uint64_t>(lut.outputEntries),
+            ClutNodes(lut.gridPoints, lut.inputChannels, lut.outputChannels) * m};
+}
+
 // True when the kernels can walk a table of these counts.
 bool CountsUsable(const LutSlot& lut) {
     return (IsLutType(lut.type) || lut.type == "MATR") && lut.inputChannels >= 1 &&
@@ -282,9 +298,8 @@ int32_t CProfil::LoadTables(int slot, const IccBytes& file) {
 
 int32_t CProfil::ReadMft1(int slot, const IccBytes& file, uint64_t tag) {
     const LutSlot& lut = m_Lut[slot];
-    const uint64_t n = static_cast<uint64_t>(lut.inputChannels);
-    const uint64_t m = static_cast<uint64_t>(lut.outputChannels);
-    const uint64_t clutValues = ClutNodes(lut.gridPoints, lut.inputChannels, lut.outputChannels) * m;
+    const TableCounts k = Counts(lut, InputEntriesInFile(slot));
+    const uint64_t n = k.inputs, m = k.outputs, clutValues = k.clutValues;
     const uint64_t curve = icc::Mft1::kCurveEntries;
     // Input curves, CLUT and output curves, one byte per value.
     const uint64_t start = tag + icc::Mft1::kTables;
@@ -300,12 +315,9 @@ int32_t CProfil::ReadMft1(int slot, const IccBytes& file, uint64_t tag) {
 
 int32_t CProfil::ReadMft2(int slot, const IccBytes& file, uint64_t tag) {
     const LutSlot& lut = m_Lut[slot];
-    const uint64_t n = static_cast<uint64_t>(lut.inputChannels);
-    const uint64_t m = static_cast<uint64_t>(lut.outputChannels);
-    const uint64_t held = static_cast<uint64_t>(lut.inputEntries);
-    const uint64_t fileEntries = static_cast<uint64_t>(InputEntriesInFile(slot));
-    const uint64_t outEntries = static_cast<uint64_t>(lut.outputEntries);
-    const uint64_t clutValues = ClutNodes(lut.gridPoints, lut.inputChannels, lut.outputChannels) * m;
+    const TableCounts k = Counts(lut, InputEntriesInFile(slot));
+    const uint64_t n = k.inputs, m = k.outputs, held = k.heldEntries, fileEntries = k.fileEntries;
+    const uint64_t outEntries = k.outputEntries, clutValues = k.clutValues;
     std::vector<uint16_t>& input = m_InputCurves[slot];
     std::vector<uint16_t>& clut = m_Clut[slot];
     std::vector<uint16_t>& output = m_OutputCurves[slot];
@@ -348,12 +360,9 @@ int32_t CProfil::ReadMft2(int slot, const IccBytes& file, uint64_t tag) {
 
 int32_t CProfil::ReadLutAB(int slot, const IccBytes& file, uint64_t tag) {
     const LutSlot& lut = m_Lut[slot];
-    const uint64_t n = static_cast<uint64_t>(lut.inputChannels);
-    const uint64_t m = static_cast<uint64_t>(lut.outputChannels);
-    const uint64_t held = static_cast<uint64_t>(lut.inputEntries);
-    const uint64_t fileEntries = static_cast<uint64_t>(InputEntriesInFile(slot));
-    const uint64_t outEntries = static_cast<uint64_t>(lut.outputEntries);
-    const uint64_t clutValues = ClutNodes(lut.gridPoints, lut.inputChannels, lut.outputChannels) * m;
+    const TableCounts k = Counts(lut, InputEntriesInFile(slot));
+    const uint64_t n = k.inputs, m = k.outputs, held = k.heldEntries, fileEntries = k.fileEntries;
+    const uint64_t outEntries = k.outputEntries, clutValues = k.clutValues;
 
     // Curve elements on both sides of a 16-bit CLUT.
     const bool aToB = lut.type == "mAB ";

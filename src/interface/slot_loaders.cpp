@@ -95,4 +95,14 @@ XYZ CIterativtoolDlg::LabToXYZ(double L, double a, double b) const {
     return {xyz.X * 100, xyz.Y * 100, xyz.Z * 100};
 }
 
+void CIterativtoolDlg::SetRecordColour(PatchRecord& record, const Lab& lab) const {
+    record.lab[0] = lab.L;
+    record.lab[1] = lab.a;
+    record.lab[2] = lab.b;
+    const XYZ xyz = LabToXYZ(lab.L, lab.a, lab.b);
+    record.xyz[0] = xyz.X;
+    record.xyz[1] = xyz.Y;
+    record.xyz[2] = xyz.Z;
+}
+
 }  // namespace vantrel

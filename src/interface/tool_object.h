@@ -142,6 +142,8 @@ public:
     // Lab (L* 0..100) to XYZ x 100 against the white of the first loaded profile among the
     // reference, paper, 3CC and ISD profiles, else against D50.
     XYZ LabToXYZ(double L, double a, double b) const;
+    // A patch record's colour: its Lab and the XYZ of it by LabToXYZ.
+    void SetRecordColour(PatchRecord& record, const Lab& lab) const;
 
     // Profile slots.
     std::unique_ptr<CProfil> m_Outprof;

@@ -73,7 +73,7 @@ int CIterativtoolDlg::OptimizeOutprof() {
         for (int c = 0; c < 7; ++c) tone[c] = x[c];
         if (columns.device == It8Kind::kRgb) {
             // RGB weighs like the ink it takes: none at 255, full at 0.
-            for (int c = 0; c < 7; ++c) tone[c] = c < 3 ? (255.0 - x[c]) / 2.55 : 100.0;
+            for (int c = 0; c < 7; ++c) tone[c] = c < 3 ? (255.0 - x[c]) / kPercentToDevice : 100.0;
         }
         const int w = SampleWeight(tone, m_Params.data());
         if (w == 0) continue;

@@ -29,13 +29,7 @@ void FillRecord(const CIterativtoolDlg& tool, PatchRecord& r, std::size_t index,
                 const Lab& lab) {
     r.sampleNumber = static_cast<uint32_t>(index + 1);
     for (int c = 0; c < 4; ++c) r.device[c] = WholePercent(device[c]);
-    r.lab[0] = lab.L;
-    r.lab[1] = lab.a;
-    r.lab[2] = lab.b;
-    const XYZ xyz = tool.LabToXYZ(lab.L, lab.a, lab.b);
-    r.xyz[0] = xyz.X;
-    r.xyz[1] = xyz.Y;
-    r.xyz[2] = xyz.Z;
+    tool.SetRecordColour(r, lab);
 }
 
 }  // namespace
